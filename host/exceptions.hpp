@@ -78,6 +78,12 @@ boost::exception_detail::clone_impl<detail::bad_alloc_impl> bad_alloc();
 
 }  // namespace foundation::core::except
 
+namespace host {
+// Raises the host's own identified error "group:leaf" (argument counts, bad
+// operands of a math routine), after giving it to do_legacy_zq_error.
+[[noreturn]] void raiseHostError(const std::string& group, const std::string& leaf);
+}  // namespace host
+
 namespace matrix::detail {
 // Gives the host the chance to report `error` by its own means. Depending on
 // the host's setting it raises a copy of `error` at once or comes back.

@@ -1,0 +1,4 @@
+// Entry of the benchmark program.
+#include <benchmark/benchmark.h>
+
+BENCHMARK_MAIN();

@@ -1,0 +1,1 @@
+// bitcmp: entry point, integer and double paths.

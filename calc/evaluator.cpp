@@ -1,0 +1,1 @@
+// The evaluator of bitcalc.

@@ -1,0 +1,2 @@
+// bitcalc: command line of the evaluator.
+int main() { return 0; }

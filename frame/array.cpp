@@ -1,0 +1,1 @@
+// The array layer of the calling frame.

@@ -1,0 +1,1 @@
+// Array records: reference counts, destruction, creation, shared copies.

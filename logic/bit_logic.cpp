@@ -1,0 +1,1 @@
+// bitand, bitor and bitxor: entry points and their common body.
