@@ -45,7 +45,7 @@ zqArraySlot makeArray(zqClassID cls, const Dims& dims, std::span<const std::byte
     if (bytes.size() != size) {
         throw std::invalid_argument("host::makeArray: the data don't match the sizes");
     }
-    std::memcpy(array->data, bytes.data(), size);
+    if (size != 0) std::memcpy(array->data, bytes.data(), size);
     if (cls == zqLogicalClass) {
         // Logical elements are the bytes 0 and 1.
         auto* elements = static_cast<unsigned char*>(array->data);

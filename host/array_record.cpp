@@ -198,7 +198,10 @@ void intrusive_ptr_add_ref(const zqArray_tag* array) noexcept {
 }
 
 void intrusive_ptr_release(const zqArray_tag* array) noexcept {
-    if (array->body->references.fetch_sub(1, std::memory_order_acq_rel) == 1) {
+    auto& references = array->body->references;
+    // A sole owner needs no atomic decrement: nobody else can take a reference.
+    if (references.load(std::memory_order_acquire) == 1 ||
+        references.fetch_sub(1, std::memory_order_acq_rel) == 1) {
         host::destroyRecord(const_cast<zqArray_tag*>(array));
     }
 }

@@ -61,13 +61,15 @@ public:
     ChunkRecycler() = default;
     ChunkRecycler(const ChunkRecycler&) = delete;
     ChunkRecycler& operator=(const ChunkRecycler&) = delete;
+    // Frees the kept chunks and keeps no more: arrays destroyed later on this
+    // thread (static ones at exit) give their chunks straight back to free.
     ~ChunkRecycler() {
-        for (FreeChunk* head : heads_) {
-            while (head) {
-                FreeChunk* next = head->next;
+        for (std::size_t index = 0; index < kChunkClassCount; ++index) {
+            while (FreeChunk* head = heads_[index]) {
+                heads_[index] = head->next;
                 std::free(head);
-                head = next;
             }
+            counts_[index] = kChunksKeptPerClass;
         }
     }
 
@@ -93,10 +95,11 @@ private:
     std::array<std::size_t, kChunkClassCount> counts_{};
 };
 
-ChunkRecycler& recycler() {
-    thread_local ChunkRecycler perThread;
-    return perThread;
-}
+// The host library is loaded with the program, so its thread-local state can
+// use the initial-exec model: no __tls_get_addr call per access.
+[[gnu::tls_model("initial-exec")]] thread_local ChunkRecycler perThreadRecycler;
+
+ChunkRecycler& recycler() { return perThreadRecycler; }
 
 // ---------------------------------------------------------------------------
 // Large blocks: mappings, huge pages, and the cache of freed blocks.
@@ -262,7 +265,11 @@ void retainStorage(StorageBlock* block) noexcept {
 }
 
 void releaseStorage(StorageBlock* block) noexcept {
-    if (block->references.fetch_sub(1, std::memory_order_acq_rel) != 1) return;
+    // A sole owner needs no atomic decrement: nobody else can take a reference.
+    if (block->references.load(std::memory_order_acquire) != 1 &&
+        block->references.fetch_sub(1, std::memory_order_acq_rel) != 1) {
+        return;
+    }
     if (block->mapped) {
         ASAN_POISON_MEMORY_REGION(block->data(), block->capacity);
         largeBlocks().give(block);
