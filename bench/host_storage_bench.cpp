@@ -80,7 +80,8 @@ void BM_ConvertDoubleToUInt64AndBack5M(benchmark::State& state) {
     constexpr unsigned long count = 5'000'000;
     zqArraySlot doubles = uninitialised(zqDoubleClass, count);
     auto* values = static_cast<double*>(doubles->data);
-    for (unsigned long i = 0; i < count; ++i) values[i] = static_cast<double>(i * 2654435761UL % (1UL << 52));
+    for (unsigned long i = 0; i < count; ++i)
+        values[i] = static_cast<double>(i * 2654435761UL % (1UL << 52));
     for (auto _ : state) {
         auto integers = matrix::convert_if_needed(doubles.get(), zqUInt64Class);
         auto back = matrix::convert_if_needed(integers.get(), zqDoubleClass);

@@ -62,14 +62,17 @@ zqArraySlot makeLogicalScalar(bool value) {
     return makeArray(zqLogicalClass, {1, 1}, std::span<const bool>(&value, 1));
 }
 
-zqArraySlot makeCharArray(std::u16string_view text) { return makeCharArray({1, text.size()}, text); }
+zqArraySlot makeCharArray(std::u16string_view text) {
+    return makeCharArray({1, text.size()}, text);
+}
 
 zqArraySlot makeCharArray(const Dims& dims, std::u16string_view units) {
     return makeArray(zqCharClass, dims, std::span<const char16_t>(units.data(), units.size()));
 }
 
 zqArraySlot makeStringArray(const Dims& dims, std::vector<std::optional<std::u16string>> elements) {
-    zqArraySlot array = checkedArray(newArray(zqStringClass, normaliseDims(dims.size(), dims.data()), false));
+    zqArraySlot array =
+        checkedArray(newArray(zqStringClass, normaliseDims(dims.size(), dims.data()), false));
     if (elements.size() != trueElementCount(*array)) {
         throw std::invalid_argument("host::makeStringArray: the elements don't match the sizes");
     }
@@ -93,7 +96,8 @@ zqArraySlot makeStringArray(const Dims& dims, std::vector<std::optional<std::u16
 }
 
 zqArraySlot makeCellArray(const Dims& dims, std::vector<zqArraySlot> elements) {
-    zqArraySlot array = checkedArray(newArray(zqCellClass, normaliseDims(dims.size(), dims.data()), false));
+    zqArraySlot array =
+        checkedArray(newArray(zqCellClass, normaliseDims(dims.size(), dims.data()), false));
     if (elements.size() != trueElementCount(*array)) {
         throw std::invalid_argument("host::makeCellArray: the elements don't match the sizes");
     }
@@ -145,7 +149,8 @@ void setIncompleteDimensions(zqArray_tag& array) {
     if (!storeDimensions(array, {sizes.data(), sizes.size(), sizes.size()}, true)) {
         throw foundation::core::except::bad_alloc();
     }
-    array.body->placeholderDims = std::make_unique<unsigned long[]>(std::max<std::size_t>(sizes.size(), 1));
+    array.body->placeholderDims =
+        std::make_unique<unsigned long[]>(std::max<std::size_t>(sizes.size(), 1));
     array.sizesN.dims = array.body->placeholderDims.get();
     array.flags |= zqIncompleteDimsFlag;
 }

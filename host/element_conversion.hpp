@@ -20,27 +20,27 @@ constexpr F powerOfTwo(int exponent) {
     return value;
 }
 
-// The integer type wide enough to hold any value of T on the way to it.
-template <class T>
-using WideInteger = std::conditional_t<std::is_signed_v<T>, long, unsigned long>;
-
 // `x` rounded half away from zero and saturated to T's range; NaN gives 0.
+// The work is done in a signed 64-bit integer, whose conversions are single
+// instructions; only uint64's upper half, where every float is whole, is
+// taken apart.
 template <class T, class F>
 T floatingToInteger(F x) {
     using Limits = std::numeric_limits<T>;
-    constexpr F above = powerOfTwo<F>(Limits::digits);      // first value past the range
-    constexpr F lowest = static_cast<F>(Limits::min());      // 0 or -2^digits, exact
+    constexpr F above = powerOfTwo<F>(Limits::digits);   // first value past the range
+    constexpr F lowest = static_cast<F>(Limits::min());  // 0 or -2^digits, exact
+    constexpr F signedAbove = powerOfTwo<F>(63);
     if (!(x < above)) return x != x ? T{0} : Limits::max();
     if (!(x > lowest)) return Limits::min();
-    // lowest < x < above: truncation fits the wide type.
-    auto whole = static_cast<WideInteger<T>>(x);
-    const F fraction = x - static_cast<F>(whole);
-    if (fraction >= F(0.5)) {
-        ++whole;
-    } else if (fraction <= F(-0.5)) {
-        --whole;
+    if constexpr (above > signedAbove) {
+        if (x >= signedAbove)
+            return static_cast<T>(static_cast<long>(x - signedAbove)) | (T{1} << 63);
     }
-    return whole > Limits::max() ? Limits::max() : static_cast<T>(whole);
+    // lowest < x < 2^63: truncation fits a long.
+    auto whole = static_cast<long>(x);
+    const F fraction = x - static_cast<F>(whole);
+    whole += static_cast<long>(fraction >= F(0.5)) - static_cast<long>(fraction <= F(-0.5));
+    return std::cmp_greater(whole, Limits::max()) ? Limits::max() : static_cast<T>(whole);
 }
 
 // True when `x` is a whole number that T holds; then `value` is it.
@@ -49,10 +49,8 @@ bool doubleHoldsInteger(double x, T& value) {
     using Limits = std::numeric_limits<T>;
     constexpr double above = powerOfTwo<double>(Limits::digits);
     if (!(x >= static_cast<double>(Limits::min()) && x < above)) return false;
-    const auto whole = static_cast<WideInteger<T>>(x);
-    if (static_cast<double>(whole) != x) return false;
-    value = static_cast<T>(whole);
-    return true;
+    value = floatingToInteger<T>(x);
+    return static_cast<double>(value) == x;
 }
 
 template <class To, class From>

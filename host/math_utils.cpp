@@ -67,7 +67,8 @@ private:
 };
 
 struct Expansion {
-    explicit Expansion(std::size_t dims) : resultDims(dims), groups(std::max<std::size_t>(dims, 1)) {}
+    explicit Expansion(std::size_t dims)
+        : resultDims(dims), groups(std::max<std::size_t>(dims, 1)) {}
 
     DimsArray<unsigned long> resultDims;
     DimsArray<MergedDims> groups;  // innermost first
@@ -209,14 +210,16 @@ zqArraySlot bitwiseWithExpansion(const zqArray_tag* first, const zqArray_tag* se
         resultClass = firstClass;
     } else if (isIntegerClass(firstClass) && secondClass == zqDoubleClass && isScalar(*second)) {
         resultClass = firstClass;
-        if (!integerElementOf(*static_cast<const double*>(second->data), resultClass, scalarElement)) {
+        if (!integerElementOf(*static_cast<const double*>(second->data), resultClass,
+                              scalarElement)) {
             badOperands();
         }
         secondData = scalarElement;
         secondDims = scalarDims;
     } else if (firstClass == zqDoubleClass && isScalar(*first) && isIntegerClass(secondClass)) {
         resultClass = secondClass;
-        if (!integerElementOf(*static_cast<const double*>(first->data), resultClass, scalarElement)) {
+        if (!integerElementOf(*static_cast<const double*>(first->data), resultClass,
+                              scalarElement)) {
             badOperands();
         }
         firstData = scalarElement;

@@ -133,7 +133,8 @@ void unmapBlock(StorageBlock* block) {
 StorageBlock* mapBlock(std::size_t bytes) {
     if (bytes > (std::size_t{1} << 46)) return nullptr;
     const bool huge = bytes + kMappedDataOffset >= kHugePageBytes;
-    const std::size_t length = roundUp(bytes + kMappedDataOffset, huge ? kHugePageBytes : kPageBytes);
+    const std::size_t length =
+        roundUp(bytes + kMappedDataOffset, huge ? kHugePageBytes : kPageBytes);
     const std::size_t request = huge ? length + kHugePageBytes : length;
     void* raw = mmap(nullptr, request, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
     if (raw == MAP_FAILED) return nullptr;
@@ -236,7 +237,8 @@ void* allocateChunk(std::size_t bytes) noexcept {
 }
 
 void freeChunk(void* chunk, std::size_t bytes) noexcept {
-    if (kRecycleChunks && bytes <= kLargestRecycledChunk && recycler().keep(chunk, chunkClass(bytes))) {
+    if (kRecycleChunks && bytes <= kLargestRecycledChunk &&
+        recycler().keep(chunk, chunkClass(bytes))) {
         return;
     }
     std::free(chunk);

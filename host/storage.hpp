@@ -14,10 +14,10 @@ namespace host {
 // large blocks).
 struct alignas(16) StorageBlock {
     std::atomic<std::size_t> references{1};
-    std::size_t capacity = 0;        // usable bytes at data()
-    void* allocation = nullptr;      // the heap chunk or mapping holding the block
-    std::size_t allocationBytes = 0; // its size
-    bool mapped = false;             // from the large-block allocator
+    std::size_t capacity = 0;         // usable bytes at data()
+    void* allocation = nullptr;       // the heap chunk or mapping holding the block
+    std::size_t allocationBytes = 0;  // its size
+    bool mapped = false;              // from the large-block allocator
 
     std::byte* data() { return reinterpret_cast<std::byte*>(this + 1); }
 };

@@ -29,8 +29,9 @@ TEST_F(ArrayRecordTest, SizesAreNormalisedTheWayTheHostShowsThem) {
         Dims given;
         Dims shown;
     };
-    const Case cases[] = {{{}, {1, 1}},          {{3}, {3, 1}},          {{2, 3, 1, 1}, {2, 3}},
-                          {{2, 1, 4, 1}, {2, 1, 4}}, {{0, 3}, {0, 3}},       {{1, 1, 1}, {1, 1}}};
+    const Case cases[] = {{{}, {1, 1}},           {{3}, {3, 1}},
+                          {{2, 3, 1, 1}, {2, 3}}, {{2, 1, 4, 1}, {2, 1, 4}},
+                          {{0, 3}, {0, 3}},       {{1, 1, 1}, {1, 1}}};
     for (const Case& c : cases) {
         zqArraySlot array = create(c.given);
         ASSERT_TRUE(array);

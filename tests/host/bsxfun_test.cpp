@@ -98,8 +98,8 @@ void expectMatchesReference(const Operation& op, const Dims& firstDims, const Va
 
 template <class T>
 class BsxfunTyped : public HostTest {};
-using ElementTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int,
-                                      long, unsigned long, bool>;
+using ElementTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                      unsigned int, long, unsigned long, bool>;
 TYPED_TEST_SUITE(BsxfunTyped, ElementTypes);
 
 TYPED_TEST(BsxfunTyped, RandomShapesWithExpansion) {
@@ -131,7 +131,8 @@ TYPED_TEST(BsxfunTyped, LengthsAndOffsetsAroundVectorWidthAndParallelLimit) {
     const unsigned long parallelLimit = (256UL << 10) / sizeof(T);
     std::vector<unsigned long> lengths;
     for (unsigned long n = 0; n <= 40; ++n) lengths.push_back(n);
-    for (unsigned long n : {parallelLimit - 1, parallelLimit, parallelLimit + 17}) lengths.push_back(n);
+    for (unsigned long n : {parallelLimit - 1, parallelLimit, parallelLimit + 17})
+        lengths.push_back(n);
     for (unsigned long n : lengths) {
         const auto first = randomValues<T>(n, random);
         const auto second = randomValues<T>(n, random);
@@ -142,13 +143,15 @@ TYPED_TEST(BsxfunTyped, LengthsAndOffsetsAroundVectorWidthAndParallelLimit) {
         const Operation& op = kOperations[n % 3];
         expectMatchesReference<T>(op, {1, n}, first, {1, n}, second, *op.helper(a.get(), b.get()));
         // A scalar of the same class on either side: a pattern partner.
-        expectMatchesReference<T>(op, {1, 1}, single, {1, n}, second, *op.helper(scalar.get(), b.get()));
-        expectMatchesReference<T>(op, {1, n}, second, {1, 1}, single, *op.helper(b.get(), scalar.get()));
+        expectMatchesReference<T>(op, {1, 1}, single, {1, n}, second,
+                                  *op.helper(scalar.get(), b.get()));
+        expectMatchesReference<T>(op, {1, n}, second, {1, 1}, single,
+                                  *op.helper(b.get(), scalar.get()));
         // A column against a row: one pattern per run.
         if (n > 0 && n < 40) {
             zqArraySlot column = arrayOf(classFor<T>(), {n, 1}, second);
             expectMatchesReference<T>(op, {n, 1}, second, {1, n}, second,
-                                   *op.helper(column.get(), b.get()));
+                                      *op.helper(column.get(), b.get()));
         }
     }
 }
@@ -163,7 +166,7 @@ TEST_F(BsxfunLargeShapes, ExpansionAcrossTheParallelLimitAndManyDimensions) {
     zqArraySlot a = arrayOf(zqUInt16Class, firstDims, first);
     zqArraySlot b = arrayOf(zqUInt16Class, secondDims, second);
     expectMatchesReference<unsigned short>(kOperations[2], firstDims, first, secondDims, second,
-                           *bitxorBsxfunHelper(a.get(), b.get()));
+                                           *bitxorBsxfunHelper(a.get(), b.get()));
 
     const Dims manyDims{2, 1, 2, 2, 1, 2, 2, 2, 1, 2, 2, 3}, fewDims{2, 1, 3};
     const auto many = randomValues<int>(productOf(manyDims), random);
@@ -176,9 +179,9 @@ TEST_F(BsxfunLargeShapes, ExpansionAcrossTheParallelLimitAndManyDimensions) {
     zqArraySlot f = arrayOf(zqInt32Class, fewDims, few);
     EXPECT_THROW(bitandBsxfunHelper(c.get(), f.get()), foundation::core::except::IMsgIDException);
     expectMatchesReference<int>(kOperations[0], manyDims, many, {2, 1}, column,
-                           *bitandBsxfunHelper(c.get(), e.get()));
+                                *bitandBsxfunHelper(c.get(), e.get()));
     expectMatchesReference<int>(kOperations[1], {2, 1, 1, 2}, corners, manyDims, many,
-                           *bitorBsxfunHelper(d.get(), c.get()));
+                                *bitorBsxfunHelper(d.get(), c.get()));
 }
 
 class BsxfunOperands : public HostTest {};
@@ -217,9 +220,11 @@ TEST_F(BsxfunOperands, RefusesWhatItDoesNotAccept) {
     const unsigned char imaginary[6] = {};
     makeComplex(*complexBytes, std::as_bytes(std::span(imaginary)));
     const std::pair<const zqArray_tag*, const zqArray_tag*> refused[] = {
-        {bytes.get(), words.get()},    {bytes.get(), doubles.get()},  {doubles.get(), doubles.get()},
-        {bytes.get(), column.get()},   {bytes.get(), logical.get()},  {bytes.get(), fraction.get()},
-        {tooLarge.get(), bytes.get()}, {bytes.get(), negative.get()}, {bytes.get(), complexBytes.get()},
+        {bytes.get(), words.get()},        {bytes.get(), doubles.get()},
+        {doubles.get(), doubles.get()},    {bytes.get(), column.get()},
+        {bytes.get(), logical.get()},      {bytes.get(), fraction.get()},
+        {tooLarge.get(), bytes.get()},     {bytes.get(), negative.get()},
+        {bytes.get(), complexBytes.get()},
     };
     for (const auto& [first, second] : refused) {
         try {

@@ -4,6 +4,7 @@
 #include "host/exceptions.hpp"
 #include "host_test_support.hpp"
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <limits>
@@ -36,19 +37,24 @@ TEST_F(ConversionTest, FloatingToIntegerEdges) {
     EXPECT_EQ((convertOne<signed char>(zqDoubleClass, -128.6, zqInt8Class)), -128);
     EXPECT_EQ((convertOne<unsigned char>(zqDoubleClass, kNaN, zqUInt8Class)), 0);
     EXPECT_EQ((convertOne<long>(zqDoubleClass, kNaN, zqInt64Class)), 0);
-    EXPECT_EQ((convertOne<long>(zqDoubleClass, kTwo63, zqInt64Class)), std::numeric_limits<long>::max());
-    EXPECT_EQ((convertOne<long>(zqDoubleClass, -kTwo63, zqInt64Class)), std::numeric_limits<long>::min());
+    EXPECT_EQ((convertOne<long>(zqDoubleClass, kTwo63, zqInt64Class)),
+              std::numeric_limits<long>::max());
+    EXPECT_EQ((convertOne<long>(zqDoubleClass, -kTwo63, zqInt64Class)),
+              std::numeric_limits<long>::min());
     EXPECT_EQ((convertOne<unsigned long>(zqDoubleClass, kTwo64, zqUInt64Class)),
               std::numeric_limits<unsigned long>::max());
     EXPECT_EQ((convertOne<unsigned long>(zqDoubleClass, kTwo63, zqUInt64Class)), 1UL << 63);
-    EXPECT_EQ((convertOne<int>(zqSingleClass, -INFINITY, zqInt32Class)), std::numeric_limits<int>::min());
+    EXPECT_EQ((convertOne<int>(zqSingleClass, -INFINITY, zqInt32Class)),
+              std::numeric_limits<int>::min());
     EXPECT_EQ((convertOne<short>(zqSingleClass, 2.5f, zqInt16Class)), 3);
 }
 
 TEST_F(ConversionTest, ToFloatingRoundsToNearestEven) {
-    EXPECT_EQ((convertOne<double>(zqUInt64Class, std::numeric_limits<unsigned long>::max(), zqDoubleClass)),
+    EXPECT_EQ((convertOne<double>(zqUInt64Class, std::numeric_limits<unsigned long>::max(),
+                                  zqDoubleClass)),
               kTwo64);
-    EXPECT_EQ((convertOne<double>(zqInt64Class, (1L << 53) + 1, zqDoubleClass)), 9007199254740992.0);
+    EXPECT_EQ((convertOne<double>(zqInt64Class, (1L << 53) + 1, zqDoubleClass)),
+              9007199254740992.0);
     EXPECT_EQ((convertOne<float>(zqInt32Class, 16777217, zqSingleClass)), 16777216.0f);
     EXPECT_EQ((convertOne<float>(zqInt32Class, 16777219, zqSingleClass)), 16777220.0f);
     EXPECT_EQ((convertOne<float>(zqDoubleClass, 0.1, zqSingleClass)), 0.1f);
@@ -69,14 +75,15 @@ TEST_F(ConversionTest, IntegerToIntegerSaturates) {
     EXPECT_EQ((convertOne<unsigned char>(zqInt16Class, short{-5}, zqUInt8Class)), 0);
     EXPECT_EQ((convertOne<signed char>(zqUInt64Class, ~0UL, zqInt8Class)), 127);
     EXPECT_EQ((convertOne<unsigned long>(zqInt64Class, -1L, zqUInt64Class)), 0u);
-    EXPECT_EQ((convertOne<long>(zqUInt64Class, ~0UL, zqInt64Class)), std::numeric_limits<long>::max());
+    EXPECT_EQ((convertOne<long>(zqUInt64Class, ~0UL, zqInt64Class)),
+              std::numeric_limits<long>::max());
 }
 
 // Every integer class against a reference built on std::round.
 template <class T>
 class ConversionToInteger : public ConversionTest {};
-using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int,
-                                      long, unsigned long>;
+using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                      unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(ConversionToInteger, IntegerTypes);
 
 template <class T>
@@ -90,22 +97,51 @@ template <class T>
 T referenceRound(double x) {
     if (std::isnan(x)) return 0;
     const double rounded = std::round(x);
-    if (rounded <= static_cast<double>(std::numeric_limits<T>::min())) return std::numeric_limits<T>::min();
-    if (rounded >= std::ldexp(1.0, std::numeric_limits<T>::digits)) return std::numeric_limits<T>::max();
+    if (rounded <= static_cast<double>(std::numeric_limits<T>::min()))
+        return std::numeric_limits<T>::min();
+    if (rounded >= std::ldexp(1.0, std::numeric_limits<T>::digits))
+        return std::numeric_limits<T>::max();
     return static_cast<T>(rounded);
 }
 
 TYPED_TEST(ConversionToInteger, MatchesRoundingReferenceOnBothPaths) {
     using T = TypeParam;
     const double top = std::ldexp(1.0, std::numeric_limits<T>::digits);
-    std::vector<double> values = {0.5, -0.5, 1.5, -1.5, top, -top, top - 0.5, top * 4, -top * 4, kNaN,
-                                  INFINITY, -INFINITY, std::nextafter(top, 0.0)};
+    std::vector<double> values = {0.5,
+                                  -0.5,
+                                  1.5,
+                                  -1.5,
+                                  top,
+                                  -top,
+                                  top - 0.5,
+                                  top * 4,
+                                  -top * 4,
+                                  kNaN,
+                                  INFINITY,
+                                  -INFINITY,
+                                  std::nextafter(top, 0.0)};
     std::mt19937_64 random(42);
     std::uniform_real_distribution<double> spread(-top * 1.25, top * 1.25);
-    // Past the parallel limit, so both the serial and the parallel body run.
+    const double nearTop = std::min(top * 1.25, std::ldexp(1.0, 53));
+    std::uniform_real_distribution<double> small(-nearTop, nearTop);
+    // Runs of whole numbers (over the whole range and near the fast path's
+    // bounds), of fractions and of halves; past the parallel limit, so both
+    // the serial and the parallel body run.
     while (values.size() < 70000) {
-        const double x = spread(random);
-        values.push_back(values.size() % 3 ? x : std::trunc(x) + 0.5);
+        switch (values.size() / 8 % 4) {
+            case 0:
+                values.push_back(std::trunc(spread(random)));
+                break;
+            case 1:
+                values.push_back(spread(random));
+                break;
+            case 2:
+                values.push_back(std::trunc(spread(random)) + 0.5);
+                break;
+            default:
+                values.push_back(std::trunc(small(random)));
+                break;
+        }
     }
     zqArraySlot source = arrayOf(zqDoubleClass, {values.size(), 1}, values);
     auto converted = matrix::convert_if_needed(source.get(), integerClass<T>());

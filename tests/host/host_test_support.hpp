@@ -14,7 +14,9 @@ namespace host::testing {
 class HostTest : public ::testing::Test {
 protected:
     void SetUp() override { liveAtStart_ = liveArrayCount(); }
-    void TearDown() override { EXPECT_EQ(liveArrayCount(), liveAtStart_) << "array records leaked"; }
+    void TearDown() override {
+        EXPECT_EQ(liveArrayCount(), liveAtStart_) << "array records leaked";
+    }
 
 private:
     std::size_t liveAtStart_ = 0;

@@ -13,8 +13,8 @@ namespace {
 
 template <class T>
 class IntVectorBitcmpTest : public ::testing::Test {};
-using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int,
-                                      long, unsigned long>;
+using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                      unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(IntVectorBitcmpTest, IntegerTypes);
 
 template <class T>
@@ -31,9 +31,11 @@ TYPED_TEST(IntVectorBitcmpTest, CountsAndMisalignmentsLeaveTheSentinel) {
         for (unsigned long count = 0; count <= 2 * 32 / sizeof(T) + 3; ++count) {
             const std::vector<T> in = ramp<T>(offset + count);
             std::vector<T> out(offset + count + 1, sentinel);
-            mu::IntVectorBitcmp<T>(out.data() + offset, const_cast<T*>(in.data()) + offset, 1, 1, count);
+            mu::IntVectorBitcmp<T>(out.data() + offset, const_cast<T*>(in.data()) + offset, 1, 1,
+                                   count);
             for (unsigned long i = 0; i < count; ++i) {
-                ASSERT_EQ(out[offset + i], static_cast<T>(~in[offset + i])) << count << " " << offset;
+                ASSERT_EQ(out[offset + i], static_cast<T>(~in[offset + i]))
+                    << count << " " << offset;
             }
             ASSERT_EQ(out[offset + count], sentinel);
             if (offset > 0) {
@@ -49,7 +51,8 @@ TYPED_TEST(IntVectorBitcmpTest, InPlaceAcrossTheParallelLimit) {
         std::vector<T> values = ramp<T>(count);
         mu::IntVectorBitcmp<T>(values.data(), values.data(), 1, 1, count);
         const std::vector<T> original = ramp<T>(count);
-        for (unsigned long i = 0; i < count; ++i) ASSERT_EQ(values[i], static_cast<T>(~original[i])) << i;
+        for (unsigned long i = 0; i < count; ++i)
+            ASSERT_EQ(values[i], static_cast<T>(~original[i])) << i;
     }
 }
 

@@ -25,14 +25,17 @@ TEST_F(StringHelpersTest, ScalarTextIsACharRowOrEmptyOrAStringScalar) {
     cases.push_back({"missing string", makeStringArray({1, 1}, {std::nullopt}), true});
     cases.push_back({"string row", makeStringArray({1, 2}, {u"a", u"b"}), false});
     cases.push_back({"double", makeDoubleScalar(8), false});
-    cases.push_back({"cell", makeCellArray({1, 1}, [] {
-                         std::vector<zqArraySlot> one;
-                         one.push_back(makeCharArray(u"int8"));
-                         return one;
-                     }()),
+    cases.push_back({"cell",
+                     makeCellArray({1, 1},
+                                   [] {
+                                       std::vector<zqArraySlot> one;
+                                       one.push_back(makeCharArray(u"int8"));
+                                       return one;
+                                   }()),
                      false});
     for (const Case& c : cases) {
-        EXPECT_EQ(Kestrelon::String::isScalarText(c.array.get(), false, true), c.scalarText) << c.what;
+        EXPECT_EQ(Kestrelon::String::isScalarText(c.array.get(), false, true), c.scalarText)
+            << c.what;
     }
     zqArraySlot incomplete = makeCharArray(u"ab");
     setIncompleteDimensions(*incomplete);
