@@ -21,11 +21,11 @@ namespace {
 
 std::string_view symbolOf(BinaryOperator op) {
     switch (op) {
-    case BinaryOperator::Add: return "+";
-    case BinaryOperator::Subtract: return "-";
-    case BinaryOperator::Multiply: return "*";
-    case BinaryOperator::Divide: return "/";
-    case BinaryOperator::Power: return "^";
+        case BinaryOperator::Add: return "+";
+        case BinaryOperator::Subtract: return "-";
+        case BinaryOperator::Multiply: return "*";
+        case BinaryOperator::Divide: return "/";
+        case BinaryOperator::Power: return "^";
     }
     return "?";
 }
@@ -33,11 +33,11 @@ std::string_view symbolOf(BinaryOperator op) {
 template <class C>
 C combine(BinaryOperator op, C left, C right) {
     switch (op) {
-    case BinaryOperator::Add: return left + right;
-    case BinaryOperator::Subtract: return left - right;
-    case BinaryOperator::Multiply: return left * right;
-    case BinaryOperator::Divide: return left / right;
-    case BinaryOperator::Power: return std::pow(left, right);
+        case BinaryOperator::Add: return left + right;
+        case BinaryOperator::Subtract: return left - right;
+        case BinaryOperator::Multiply: return left * right;
+        case BinaryOperator::Divide: return left / right;
+        case BinaryOperator::Power: return std::pow(left, right);
     }
     return left;
 }
@@ -62,18 +62,20 @@ void requireArithmeticOperand(const zqArray_tag& operand, std::string_view symbo
     const zqClassID cls = host::classOf(operand);
     if (!holdsElements(cls)) {
         throw CalcError(errorid::unsupported,
-                        joinText("Operator '", symbol, "' isn't defined for operands of class ", className(cls), "."));
+                        joinText("Operator '", symbol, "' isn't defined for operands of class ",
+                                 className(cls), "."));
     }
     if (host::isComplex(operand)) {
-        throw CalcError(errorid::unsupported, joinText("Operator '", symbol, "' isn't defined for complex operands."));
+        throw CalcError(errorid::unsupported,
+                        joinText("Operator '", symbol, "' isn't defined for complex operands."));
     }
 }
 
 zqClassID resultClassOf(zqClassID left, zqClassID right) {
     if (isIntegerClass(left) && isIntegerClass(right) && left != right) {
         throw CalcError(errorid::classMismatch,
-                        joinText("Integers of different classes can't be combined: ", className(left), " with ",
-                                 className(right), "."));
+                        joinText("Integers of different classes can't be combined: ",
+                                 className(left), " with ", className(right), "."));
     }
     if (isIntegerClass(left)) return left;
     if (isIntegerClass(right)) return right;
@@ -84,7 +86,8 @@ zqClassID resultClassOf(zqClassID left, zqClassID right) {
 // out[i] = combine(left[i * leftStride], right[i * rightStride]); a scalar
 // operand has the stride 0.
 template <class Tag>
-void combineInto(zqArray_tag& result, BinaryOperator op, const zqArray_tag& left, const zqArray_tag& right) {
+void combineInto(zqArray_tag& result, BinaryOperator op, const zqArray_tag& left,
+                 const zqArray_tag& right) {
     using T = typename Tag::type;
     using C = std::conditional_t<isIntegerTag<Tag>, long double, double>;
     const Reader<C> readLeft = readerFor<C>(host::classOf(left));
@@ -94,7 +97,8 @@ void combineInto(zqArray_tag& result, BinaryOperator op, const zqArray_tag& left
     T* out = mutableElementsOf<T>(result);
     const std::size_t count = host::elementCount(result);
     for (std::size_t i = 0; i < count; ++i) {
-        out[i] = castElement<T>(combine<C>(op, readLeft(left.data, i * leftStride), readRight(right.data, i * rightStride)));
+        out[i] = castElement<T>(combine<C>(op, readLeft(left.data, i * leftStride),
+                                           readRight(right.data, i * rightStride)));
     }
 }
 
@@ -113,8 +117,10 @@ zqArraySlot applyBinary(BinaryOperator op, const zqArray_tag& left, const zqArra
     } else if (isScalar(left) || leftDims == rightDims) {
         dims = rightDims;
     } else {
-        throw CalcError(errorid::sizeMismatch, joinText("Operator '", symbolOf(op), "' needs operands of one size or a scalar, not ",
-                                                        dimsText(leftDims), " and ", dimsText(rightDims), "."));
+        throw CalcError(
+            errorid::sizeMismatch,
+            joinText("Operator '", symbolOf(op), "' needs operands of one size or a scalar, not ",
+                     dimsText(leftDims), " and ", dimsText(rightDims), "."));
     }
 
     zqArraySlot result = host::makeArray(cls, dims);
@@ -134,7 +140,11 @@ zqArraySlot applySign(UnaryOperator op, const zqArray_tag& operand) {
     // and keeps the sign of zero right for floating values.
     zqArraySlot result = host::makeArray(cls, host::dimensions(operand));
     visitClass<NumericClasses>(
-        cls, [&]<class Tag>(Tag) { combineInto<Tag>(*result, BinaryOperator::Multiply, operand, *sign); }, [] {});
+        cls,
+        [&]<class Tag>(Tag) {
+            combineInto<Tag>(*result, BinaryOperator::Multiply, operand, *sign);
+        },
+        [] {});
     return result;
 }
 

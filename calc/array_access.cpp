@@ -43,11 +43,11 @@ constexpr std::array<NamedClass, 11> numberClasses{{
 
 std::string className(zqClassID cls) {
     switch (cls) {
-    case zqCellClass: return "cell";
-    case zqStructClass: return "struct";
-    case zqCharClass: return "char";
-    case zqStringClass: return "string";
-    default: break;
+        case zqCellClass: return "cell";
+        case zqStructClass: return "struct";
+        case zqCharClass: return "char";
+        case zqStringClass: return "string";
+        default: break;
     }
     for (const NamedClass& named : numberClasses) {
         if (named.cls == cls) return std::string(named.name.begin(), named.name.end());
@@ -85,7 +85,8 @@ std::size_t elementCountOf(const Dims& dims) {
     }
     for (unsigned long size : dims) {
         if (__builtin_mul_overflow(count, size, &count)) {
-            throw CalcError(errorid::tooLarge, joinText("An array of size ", dimsText(dims), " is too large."));
+            throw CalcError(errorid::tooLarge,
+                            joinText("An array of size ", dimsText(dims), " is too large."));
         }
     }
     return count;
@@ -95,9 +96,10 @@ void checkArraySize(const Dims& dims, zqClassID cls) {
     const std::size_t count = elementCountOf(dims);
     const std::size_t width = std::max<std::size_t>(host::elementSize(cls), sizeof(void*));
     if (count > arraySizeLimit / width) {
-        throw CalcError(errorid::tooLarge, joinText("An array of size ", dimsText(dims), " and class ", className(cls),
-                                                    " exceeds bitcalc's limit of ", bytesText(arraySizeLimit),
-                                                    " per array."));
+        throw CalcError(
+            errorid::tooLarge,
+            joinText("An array of size ", dimsText(dims), " and class ", className(cls),
+                     " exceeds bitcalc's limit of ", bytesText(arraySizeLimit), " per array."));
     }
 }
 
@@ -131,7 +133,9 @@ std::optional<std::u16string> textOf(const zqArray_tag& array) {
 double elementAsDouble(const zqArray_tag& array, std::size_t index) {
     return visitClass<ElementClasses>(
         host::classOf(array),
-        [&]<class Tag>(Tag) { return static_cast<double>(elementsOf<typename Tag::type>(array)[index]); },
+        [&]<class Tag>(Tag) {
+            return static_cast<double>(elementsOf<typename Tag::type>(array)[index]);
+        },
         [] { return std::numeric_limits<double>::quiet_NaN(); });
 }
 

@@ -20,7 +20,8 @@ namespace {
 // other arrays of that class, in column-major order.
 class ElementWriter {
 public:
-    ElementWriter(zqClassID cls, Dims dims, bool complex) : cls_(cls), dims_(std::move(dims)), complex_(complex) {
+    ElementWriter(zqClassID cls, Dims dims, bool complex)
+        : cls_(cls), dims_(std::move(dims)), complex_(complex) {
         count_ = elementCountOf(dims_);
         if (holdsElements(cls_)) {
             checkArraySize(dims_, cls_);
@@ -32,7 +33,8 @@ public:
         } else if (cls_ == zqCellClass) {
             cells_.reserve(count_);
         } else {
-            throw CalcError(errorid::unsupported, joinText("Arrays of class ", className(cls_), " can't be copied."));
+            throw CalcError(errorid::unsupported,
+                            joinText("Arrays of class ", className(cls_), " can't be copied."));
         }
     }
 
@@ -41,10 +43,12 @@ public:
         if (count == 0) return;  // empty arrays may have no storage at all
         if (array_) {
             auto* out = static_cast<std::byte*>(array_->data) + written_ * width_;
-            std::memcpy(out, static_cast<const std::byte*>(source.data) + first * width_, count * width_);
+            std::memcpy(out, static_cast<const std::byte*>(source.data) + first * width_,
+                        count * width_);
             if (const void* imaginary = host::imaginaryData(source); imaginary && complex_) {
                 std::memcpy(imaginary_.data() + written_ * width_,
-                            static_cast<const std::byte*>(imaginary) + first * width_, count * width_);
+                            static_cast<const std::byte*>(imaginary) + first * width_,
+                            count * width_);
             }
         } else if (cls_ == zqStringClass) {
             for (std::size_t i = first; i < first + count; ++i) {
@@ -114,8 +118,9 @@ zqArraySlot copyArray(const zqArray_tag& source) {
 zqArraySlot reshapeArray(const zqArray_tag& source, const Dims& dims) {
     const std::size_t count = host::elementCount(source);
     if (elementCountOf(dims) != count) {
-        throw CalcError(errorid::invalidArgument, joinText("reshape: an array of ", std::to_string(count),
-                                                           " elements can't have the size ", dimsText(dims), "."));
+        throw CalcError(errorid::invalidArgument,
+                        joinText("reshape: an array of ", std::to_string(count),
+                                 " elements can't have the size ", dimsText(dims), "."));
     }
     ElementWriter writer(host::classOf(source), dims, host::isComplex(source));
     writer.append(source, 0, count);
@@ -125,16 +130,18 @@ zqArraySlot reshapeArray(const zqArray_tag& source, const Dims& dims) {
 zqArraySlot transposeArray(const zqArray_tag& source, bool conjugate) {
     const Dims dims = host::dimensions(source);
     if (dims.size() != 2) {
-        throw CalcError(errorid::unsupported,
-                        joinText("Transpose is defined for two-dimensional arrays, not for one of size ",
-                                 dimsText(dims), "."));
+        throw CalcError(
+            errorid::unsupported,
+            joinText("Transpose is defined for two-dimensional arrays, not for one of size ",
+                     dimsText(dims), "."));
     }
     const std::size_t rows = dims[0];
     const std::size_t columns = dims[1];
     const bool complex = host::isComplex(source);
     ElementWriter writer(host::classOf(source), {columns, rows}, complex);
     for (std::size_t row = 0; row < rows; ++row) {
-        for (std::size_t column = 0; column < columns; ++column) writer.append(source, row + column * rows, 1);
+        for (std::size_t column = 0; column < columns; ++column)
+            writer.append(source, row + column * rows, 1);
     }
     if (conjugate) writer.conjugate();
     zqArraySlot result = writer.finish();
@@ -147,15 +154,17 @@ zqArraySlot concatenate(std::size_t dimension, std::span<const zqArray_tag* cons
     for (const zqArray_tag* piece : pieces) {
         if (!isZeroByZero(host::dimensions(*piece))) kept.push_back(piece);
     }
-    if (kept.empty()) return pieces.empty() ? filledArray(zqDoubleClass, {0, 0}, 0) : copyArray(*pieces.front());
+    if (kept.empty())
+        return pieces.empty() ? filledArray(zqDoubleClass, {0, 0}, 0) : copyArray(*pieces.front());
 
     const zqClassID cls = host::classOf(*kept.front());
     std::size_t rank = dimension + 1;
     for (const zqArray_tag* piece : kept) {
         if (host::classOf(*piece) != cls) {
-            throw CalcError(errorid::classMismatch, joinText("Concatenation needs arrays of one class, not ",
-                                                             className(cls), " and ",
-                                                             className(host::classOf(*piece)), "."));
+            throw CalcError(
+                errorid::classMismatch,
+                joinText("Concatenation needs arrays of one class, not ", className(cls), " and ",
+                         className(host::classOf(*piece)), "."));
         }
         rank = std::max(rank, host::dimensions(*piece).size());
     }
@@ -168,10 +177,11 @@ zqArraySlot concatenate(std::size_t dimension, std::span<const zqArray_tag* cons
         const Dims dims = paddedTo(host::dimensions(*piece), rank);
         for (std::size_t d = 0; d < rank; ++d) {
             if (d != dimension && dims[d] != result[d]) {
-                throw CalcError(errorid::sizeMismatch,
-                                joinText("Arrays of sizes ", dimsText(host::dimensions(*kept.front())), " and ",
-                                         dimsText(host::dimensions(*piece)), " can't be concatenated ",
-                                         dimension == 0 ? "vertically." : "horizontally."));
+                throw CalcError(
+                    errorid::sizeMismatch,
+                    joinText("Arrays of sizes ", dimsText(host::dimensions(*kept.front())), " and ",
+                             dimsText(host::dimensions(*piece)), " can't be concatenated ",
+                             dimension == 0 ? "vertically." : "horizontally."));
             }
         }
         result[dimension] += dims[dimension];
@@ -208,8 +218,9 @@ std::size_t cellDepth(const zqArray_tag& array) {
 zqArraySlot makeCell(const Dims& dims, std::span<const zqArray_tag* const> elements) {
     for (const zqArray_tag* element : elements) {
         if (cellDepth(*element) >= maxCellDepth) {
-            throw CalcError(errorid::tooLarge,
-                            joinText("Cells can be nested ", std::to_string(maxCellDepth), " deep at most."));
+            throw CalcError(
+                errorid::tooLarge,
+                joinText("Cells can be nested ", std::to_string(maxCellDepth), " deep at most."));
         }
     }
     std::vector<zqArraySlot> copies;
@@ -229,21 +240,23 @@ zqArraySlot filledArray(zqClassID cls, const Dims& dims, double value) {
             std::fill_n(mutableElementsOf<T>(*array), count, castElement<T>(value));
         },
         [&] {
-            throw CalcError(errorid::invalidArgument,
-                            joinText("Arrays of class ", className(cls), " can't be filled with numbers."));
+            throw CalcError(errorid::invalidArgument, joinText("Arrays of class ", className(cls),
+                                                               " can't be filled with numbers."));
         });
     return array;
 }
 
 zqArraySlot rangeArray(double first, double step, double last) {
     if (!std::isfinite(first) || !std::isfinite(step) || !std::isfinite(last)) {
-        throw CalcError(errorid::invalidArgument, "The limits and the step of a range must be finite.");
+        throw CalcError(errorid::invalidArgument,
+                        "The limits and the step of a range must be finite.");
     }
     const double quotient = (last - first) / step;
     const bool empty = step == 0 || !(quotient >= 0);
     // A quotient a few units in the last place short of a whole number
     // still reaches the last value: 0:0.1:0.3 has 4 elements.
-    const double steps = empty ? -1 : std::floor(quotient * (1 + 4 * std::numeric_limits<double>::epsilon()));
+    const double steps =
+        empty ? -1 : std::floor(quotient * (1 + 4 * std::numeric_limits<double>::epsilon()));
     if (steps + 1 > static_cast<double>(std::numeric_limits<unsigned long>::max() / 8)) {
         throw CalcError(errorid::tooLarge, "The range has too many elements.");
     }

@@ -48,7 +48,8 @@ bool isRealNumber(const zqArray_tag& array) {
 // One size: a real, whole, finite, non-negative number.
 unsigned long sizeFrom(const Builtin& self, double value) {
     if (!(value >= 0) || value != std::floor(value) || value >= 0x1p63) {
-        invalid(self, joinText("sizes must be whole numbers from 0 up, not ", canonicalText(value), "."));
+        invalid(self,
+                joinText("sizes must be whole numbers from 0 up, not ", canonicalText(value), "."));
     }
     return static_cast<unsigned long>(value);
 }
@@ -56,7 +57,8 @@ unsigned long sizeFrom(const Builtin& self, double value) {
 // Sizes as a filler or reshape takes them: none (1-by-1), one scalar n
 // (n-by-n), one vector of sizes, or several scalars. `placeholder`, when
 // given, receives the position of the one empty [] among several scalars.
-Dims sizesFrom(const Builtin& self, std::span<Value> arguments, std::optional<std::size_t>* placeholder = nullptr) {
+Dims sizesFrom(const Builtin& self, std::span<Value> arguments,
+               std::optional<std::size_t>* placeholder = nullptr) {
     if (arguments.empty()) return {1, 1};
     if (arguments.size() == 1) {
         const zqArray_tag& sizes = arguments[0].array();
@@ -64,7 +66,8 @@ Dims sizesFrom(const Builtin& self, std::span<Value> arguments, std::optional<st
         const std::size_t count = host::elementCount(sizes);
         if (count == 0) invalid(self, "expected at least one size.");
         Dims dims;
-        for (std::size_t i = 0; i < count; ++i) dims.push_back(sizeFrom(self, elementAsDouble(sizes, i)));
+        for (std::size_t i = 0; i < count; ++i)
+            dims.push_back(sizeFrom(self, elementAsDouble(sizes, i)));
         if (dims.size() == 1) dims.push_back(dims[0]);
         return dims;
     }
@@ -76,7 +79,8 @@ Dims sizesFrom(const Builtin& self, std::span<Value> arguments, std::optional<st
             dims.push_back(1);
             continue;
         }
-        if (!isRealNumber(size) || !isScalar(size)) invalid(self, "each size must be a real scalar.");
+        if (!isRealNumber(size) || !isScalar(size))
+            invalid(self, "each size must be a real scalar.");
         dims.push_back(sizeFrom(self, elementAsDouble(size, 0)));
     }
     return dims;
@@ -87,7 +91,9 @@ zqClassID trailingClass(const Builtin& self, std::span<Value>& arguments) {
     if (arguments.empty() || !isText(arguments.back().array())) return self.cls;
     const std::u16string name = requireText(self, arguments.back().array());
     const std::optional<zqClassID> cls = numberClassNamed(name);
-    if (!cls) invalid(self, joinText("'", toUtf8(name), "' isn't the name of a numeric class or logical."));
+    if (!cls)
+        invalid(self,
+                joinText("'", toUtf8(name), "' isn't the name of a numeric class or logical."));
     arguments = arguments.first(arguments.size() - 1);
     return *cls;
 }
@@ -103,7 +109,8 @@ zqArraySlot integerLimitBody(const Builtin& self, std::span<Value> arguments) {
     if (!arguments.empty()) {
         const std::u16string name = requireText(self, arguments[0].array());
         cls = numberClassNamed(name).value_or(zqNoClass);
-        if (!isIntegerClass(cls)) invalid(self, joinText("'", toUtf8(name), "' isn't the name of an integer class."));
+        if (!isIntegerClass(cls))
+            invalid(self, joinText("'", toUtf8(name), "' isn't the name of an integer class."));
     }
     return integerLimit(cls, self.fill != 0);
 }
@@ -140,8 +147,8 @@ zqArraySlot reshapeBody(const Builtin& self, std::span<Value> arguments) {
         dims[*placeholder] = count / known;
     }
     if (elementCountOf(dims) != count) {
-        invalid(self, joinText("an array of ", std::to_string(count), " elements can't have the size ",
-                               dimsText(dims), "."));
+        invalid(self, joinText("an array of ", std::to_string(count),
+                               " elements can't have the size ", dimsText(dims), "."));
     }
     zqArraySlot result = reshapeArray(source, dims);
     if (host::isSparse(source)) host::setSparse(*result, true);
@@ -178,7 +185,8 @@ zqArraySlot complexBody(const Builtin& self, std::span<Value> arguments) {
     requireCount(arguments, 1, 2);
     const zqArray_tag& real = arguments[0].array();
     const zqClassID cls = host::classOf(real);
-    if (!isNumericClass(cls) || host::isComplex(real)) invalid(self, "the real part must be a real numeric array.");
+    if (!isNumericClass(cls) || host::isComplex(real))
+        invalid(self, "the real part must be a real numeric array.");
     zqArraySlot imaginary;
     if (arguments.size() == 2) {
         const zqArray_tag& given = arguments[1].array();
@@ -209,7 +217,8 @@ zqArraySlot stringBody(const Builtin& self, std::span<Value> arguments) {
     const zqArray_tag& source = arguments[0].array();
     const zqClassID cls = host::classOf(source);
     if (cls == zqStringClass) return copyArray(source);
-    if (cls != zqCharClass) invalid(self, joinText("takes text or missing, not ", className(cls), "."));
+    if (cls != zqCharClass)
+        invalid(self, joinText("takes text or missing, not ", className(cls), "."));
     const Dims dims = host::dimensions(source);
     if (dims.size() != 2) invalid(self, "takes a two-dimensional char array.");
     if (dims[0] == 0 && dims[1] == 0) return stringScalar(std::u16string());
@@ -218,7 +227,8 @@ zqArraySlot stringBody(const Builtin& self, std::span<Value> arguments) {
     std::vector<std::optional<std::u16string>> rows;
     for (std::size_t row = 0; row < dims[0]; ++row) {
         std::u16string text;
-        for (std::size_t column = 0; column < dims[1]; ++column) text.push_back(units[row + column * dims[0]]);
+        for (std::size_t column = 0; column < dims[1]; ++column)
+            text.push_back(units[row + column * dims[0]]);
         rows.emplace_back(std::move(text));
     }
     return host::makeStringArray({dims[0], 1}, std::move(rows));

@@ -56,14 +56,16 @@ private:
 
 std::string canonicalValueText(const zqArray_tag& array) {
     return joinText(className(host::classOf(array)), ' ', dimsText(host::dimensions(array)),
-                    host::isSparse(array) ? " sparse" : "", host::isComplex(array) ? " complex" : "", ' ',
-                    elementsText(array));
+                    host::isSparse(array) ? " sparse" : "",
+                    host::isComplex(array) ? " complex" : "", ' ', elementsText(array));
 }
 
 std::string canonicalErrorLine(const ErrorReport& error) {
     return joinText("error: ", error.identifier.empty() ? error.message : error.identifier);
 }
 
-std::unique_ptr<Display> makeCanonicalDisplay(std::ostream& out) { return std::make_unique<CanonicalDisplay>(out); }
+std::unique_ptr<Display> makeCanonicalDisplay(std::ostream& out) {
+    return std::make_unique<CanonicalDisplay>(out);
+}
 
 }  // namespace bitcalc

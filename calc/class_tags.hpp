@@ -49,13 +49,14 @@ using NumericClasses = Append<IntegerClasses, SingleTag, DoubleTag>::type;
 using ElementClasses = Append<NumericClasses, LogicalTag, CharTag>::type;
 
 template <class Tag>
-inline constexpr bool isIntegerTag = std::is_integral_v<typename Tag::type> &&
-                                     !std::is_same_v<typename Tag::type, bool> &&
-                                     !std::is_same_v<typename Tag::type, char16_t>;
+inline constexpr bool isIntegerTag =
+    std::is_integral_v<typename Tag::type> && !std::is_same_v<typename Tag::type, bool> &&
+    !std::is_same_v<typename Tag::type, char16_t>;
 
 namespace detail {
 template <class... Tags, class Visitor, class Otherwise>
-decltype(auto) visitClassIn(TypeList<Tags...>, zqClassID id, Visitor& visitor, Otherwise& otherwise) {
+decltype(auto) visitClassIn(TypeList<Tags...>, zqClassID id, Visitor& visitor,
+                            Otherwise& otherwise) {
     using Result = decltype(otherwise());
     if constexpr (std::is_void_v<Result>) {
         const bool found = ((id == Tags::id ? (visitor(Tags{}), true) : false) || ...);

@@ -20,7 +20,8 @@ zqArraySlot charsAsDoubles(const zqArray_tag& source) {
     const std::size_t count = host::elementCount(source);
     const char16_t* units = elementsOf<char16_t>(source);
     std::vector<double> values(units, units + count);
-    return host::makeArray(zqDoubleClass, host::dimensions(source), std::span<const double>(values));
+    return host::makeArray(zqDoubleClass, host::dimensions(source),
+                           std::span<const double>(values));
 }
 
 zqArraySlot convertReal(const zqArray_tag& source, zqClassID cls) {
@@ -31,7 +32,8 @@ zqArraySlot convertReal(const zqArray_tag& source, zqClassID cls) {
 }
 
 std::span<const std::byte> realBytes(const zqArray_tag& array) {
-    return {static_cast<const std::byte*>(array.data), host::elementCount(array) * host::elementSize(host::classOf(array))};
+    return {static_cast<const std::byte*>(array.data),
+            host::elementCount(array) * host::elementSize(host::classOf(array))};
 }
 
 }  // namespace
@@ -40,7 +42,8 @@ zqArraySlot convertArray(const zqArray_tag& source, zqClassID cls) {
     const zqClassID from = host::classOf(source);
     if (!holdsElements(from)) {
         throw CalcError(errorid::invalidArgument,
-                        joinText("Conversion to ", className(cls), " from ", className(from), " is not possible."));
+                        joinText("Conversion to ", className(cls), " from ", className(from),
+                                 " is not possible."));
     }
     const bool complex = host::isComplex(source);
     if (complex && cls == zqLogicalClass) {
@@ -54,8 +57,8 @@ zqArraySlot convertArray(const zqArray_tag& source, zqClassID cls) {
         // real array of the source's class.
         const Dims dims = host::dimensions(source);
         zqArraySlot realPart = host::makeArray(from, dims, realBytes(source));
-        const std::span<const std::byte> imaginaryBytes{static_cast<const std::byte*>(host::imaginaryData(source)),
-                                                       realBytes(source).size()};
+        const std::span<const std::byte> imaginaryBytes{
+            static_cast<const std::byte*>(host::imaginaryData(source)), realBytes(source).size()};
         zqArraySlot imaginaryPart = host::makeArray(from, dims, imaginaryBytes);
         result = convertReal(*realPart, cls);
         const zqArraySlot convertedImaginary = convertReal(*imaginaryPart, cls);
@@ -64,7 +67,8 @@ zqArraySlot convertArray(const zqArray_tag& source, zqClassID cls) {
         result = convertReal(source, cls);
     }
     host::setWantsSharedResult(*result, false);
-    host::setSparse(*result, host::isSparse(source) && (cls == zqDoubleClass || cls == zqLogicalClass));
+    host::setSparse(*result,
+                    host::isSparse(source) && (cls == zqDoubleClass || cls == zqLogicalClass));
     return result;
 }
 
@@ -77,9 +81,10 @@ zqArraySlot integerLimit(zqClassID cls, bool largest) {
             return host::makeArray(cls, {1, 1}, std::span<const T>(&value, 1));
         },
         [&]() -> zqArraySlot {
-            throw CalcError(errorid::invalidArgument,
-                            joinText(largest ? "intmax" : "intmin", " takes the name of an integer class, not ",
-                                     className(cls), "."));
+            throw CalcError(
+                errorid::invalidArgument,
+                joinText(largest ? "intmax" : "intmin", " takes the name of an integer class, not ",
+                         className(cls), "."));
         });
 }
 

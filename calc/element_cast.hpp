@@ -20,18 +20,22 @@ T castElement(C value) {
             // From the largest finite value plus half a unit in the last
             // place on, the value rounds to infinity.
             constexpr T largest = std::numeric_limits<T>::max();
-            const C overflow = static_cast<C>(largest) +
-                               (static_cast<C>(largest) - static_cast<C>(std::nextafter(largest, T{0}))) / 2;
+            const C overflow =
+                static_cast<C>(largest) +
+                (static_cast<C>(largest) - static_cast<C>(std::nextafter(largest, T{0}))) / 2;
             if (std::isfinite(value) && std::fabs(value) >= overflow) {
-                return value < 0 ? -std::numeric_limits<T>::infinity() : std::numeric_limits<T>::infinity();
+                return value < 0 ? -std::numeric_limits<T>::infinity()
+                                 : std::numeric_limits<T>::infinity();
             }
         }
         return static_cast<T>(value);
     } else {
         if (std::isnan(value)) return 0;
         const C rounded = std::round(value);
-        if (rounded <= static_cast<C>(std::numeric_limits<T>::min())) return std::numeric_limits<T>::min();
-        if (rounded >= static_cast<C>(std::numeric_limits<T>::max())) return std::numeric_limits<T>::max();
+        if (rounded <= static_cast<C>(std::numeric_limits<T>::min()))
+            return std::numeric_limits<T>::min();
+        if (rounded >= static_cast<C>(std::numeric_limits<T>::max()))
+            return std::numeric_limits<T>::max();
         return static_cast<T>(rounded);
     }
 }

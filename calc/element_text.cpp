@@ -18,8 +18,8 @@ namespace {
 template <class T>
 std::string realText(T value, NumberStyle style) {
     if constexpr (std::is_floating_point_v<T>) {
-        if (style == NumberStyle::Human && !(std::isfinite(value) && value == std::trunc(value) &&
-                                             std::fabs(value) <= 0x1p64)) {
+        if (style == NumberStyle::Human &&
+            !(std::isfinite(value) && value == std::trunc(value) && std::fabs(value) <= 0x1p64)) {
             return shortestText(value);
         }
     }

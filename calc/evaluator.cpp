@@ -44,11 +44,13 @@ struct CallArguments {
 std::optional<double> rangeOperand(const zqArray_tag& array) {
     const zqClassID cls = host::classOf(array);
     if (!holdsElements(cls) || host::isComplex(array)) {
-        throw CalcError(errorid::invalidArgument,
-                        joinText("The operands of a range must be real numbers, not ", className(cls), "."));
+        throw CalcError(
+            errorid::invalidArgument,
+            joinText("The operands of a range must be real numbers, not ", className(cls), "."));
     }
     if (isEmpty(array)) return std::nullopt;
-    if (!isScalar(array)) throw CalcError(errorid::invalidArgument, "The operands of a range must be scalars.");
+    if (!isScalar(array))
+        throw CalcError(errorid::invalidArgument, "The operands of a range must be scalars.");
     return elementAsDouble(array, 0);
 }
 
@@ -90,48 +92,52 @@ void Evaluator::show(const std::string& name) { display_.showValue(name, *variab
 void Evaluator::execute(const Statement& statement) {
     const Expr& expr = *statement.value;
     switch (statement.kind) {
-    case Statement::Kind::Expression: {
-        if (const auto* name = std::get_if<NameRef>(&expr.node); name && variable(name->name)) {
-            if (statement.displayed) show(name->name);
+        case Statement::Kind::Expression: {
+            if (const auto* name = std::get_if<NameRef>(&expr.node); name && variable(name->name)) {
+                if (statement.displayed) show(name->name);
+                return;
+            }
+            zqArraySlot result;
+            if (isCall(expr)) {
+                // A call at top level asks for no output; the value, if the
+                // function gives one, becomes ans.
+                result = std::move(call(expr, 0).front());
+                if (!result) return;
+            } else {
+                result = evaluate(expr).release();
+            }
+            assign("ans", std::move(result));
+            if (statement.displayed) show("ans");
             return;
         }
-        zqArraySlot result;
-        if (isCall(expr)) {
-            // A call at top level asks for no output; the value, if the
-            // function gives one, becomes ans.
-            result = std::move(call(expr, 0).front());
-            if (!result) return;
-        } else {
-            result = evaluate(expr).release();
-        }
-        assign("ans", std::move(result));
-        if (statement.displayed) show("ans");
-        return;
-    }
-    case Statement::Kind::Assignment:
-        assign(statement.targets.front(), evaluate(expr).release());
-        if (statement.displayed) show(statement.targets.front());
-        return;
-    case Statement::Kind::MultipleAssignment: {
-        if (!isCall(expr)) {
-            throw CalcError(errorid::unsupported, "A multiple assignment needs a function call on the right.");
-        }
-        const int count = static_cast<int>(statement.targets.size());
-        std::vector<zqArraySlot> outputs = call(expr, count);
-        for (int i = 0; i < count; ++i) {
-            if (!outputs[static_cast<std::size_t>(i)]) {
-                throw CalcError(errorid::noOutput, joinText("The call gave no value for output ", std::to_string(i + 1),
-                                                            ", ", statement.targets[static_cast<std::size_t>(i)], "."));
+        case Statement::Kind::Assignment:
+            assign(statement.targets.front(), evaluate(expr).release());
+            if (statement.displayed) show(statement.targets.front());
+            return;
+        case Statement::Kind::MultipleAssignment: {
+            if (!isCall(expr)) {
+                throw CalcError(errorid::unsupported,
+                                "A multiple assignment needs a function call on the right.");
             }
+            const int count = static_cast<int>(statement.targets.size());
+            std::vector<zqArraySlot> outputs = call(expr, count);
+            for (int i = 0; i < count; ++i) {
+                if (!outputs[static_cast<std::size_t>(i)]) {
+                    throw CalcError(
+                        errorid::noOutput,
+                        joinText("The call gave no value for output ", std::to_string(i + 1), ", ",
+                                 statement.targets[static_cast<std::size_t>(i)], "."));
+                }
+            }
+            for (int i = 0; i < count; ++i) {
+                assign(statement.targets[static_cast<std::size_t>(i)],
+                       std::move(outputs[static_cast<std::size_t>(i)]));
+            }
+            if (statement.displayed) {
+                for (const std::string& target : statement.targets) show(target);
+            }
+            return;
         }
-        for (int i = 0; i < count; ++i) {
-            assign(statement.targets[static_cast<std::size_t>(i)], std::move(outputs[static_cast<std::size_t>(i)]));
-        }
-        if (statement.displayed) {
-            for (const std::string& target : statement.targets) show(target);
-        }
-        return;
-    }
     }
 }
 
@@ -148,21 +154,25 @@ std::vector<zqArraySlot> Evaluator::call(const Expr& expr, int nlhs) {
     return call(std::get<NameRef>(expr.node).name, {}, false, nlhs);
 }
 
-std::vector<zqArraySlot> Evaluator::call(const std::string& name, std::span<const ExprPtr> arguments,
-                                         bool withParentheses, int nlhs) {
+std::vector<zqArraySlot> Evaluator::call(const std::string& name,
+                                         std::span<const ExprPtr> arguments, bool withParentheses,
+                                         int nlhs) {
     if (withParentheses && variable(name)) {
-        throw CalcError(errorid::unsupported, joinText("'", name, "' is a variable, and indexing isn't supported."));
+        throw CalcError(errorid::unsupported,
+                        joinText("'", name, "' is a variable, and indexing isn't supported."));
     }
     if (const LibraryFunction* function = findLibraryFunction(functions_, name)) {
         if (!function->entry) {
-            throw CalcError(errorid::undefinedFunction,
-                            joinText("Undefined function '", name, "': libbitfcns.so doesn't define it yet."));
+            throw CalcError(
+                errorid::undefinedFunction,
+                joinText("Undefined function '", name, "': libbitfcns.so doesn't define it yet."));
         }
         CallArguments inputs;
         for (const ExprPtr& argument : arguments) inputs.values.push_back(evaluate(*argument));
         inputs.flagTemporaries();
         std::vector<zqArraySlot> outputs(static_cast<std::size_t>(std::max(1, nlhs)));
-        function->entry(nlhs, outputs.data(), static_cast<int>(inputs.arrays.size()), inputs.arrays.data());
+        function->entry(nlhs, outputs.data(), static_cast<int>(inputs.arrays.size()),
+                        inputs.arrays.data());
         for (zqArraySlot& output : outputs) {
             if (output) host::setWantsSharedResult(*output, false);
         }
@@ -176,14 +186,18 @@ std::vector<zqArraySlot> Evaluator::call(const std::string& name, std::span<cons
         outputs.push_back(callBuiltin(*builtin, values));
         return outputs;
     }
-    if (withParentheses) throw CalcError(errorid::undefinedFunction, joinText("Undefined function '", name, "'."));
-    throw CalcError(errorid::undefinedName, joinText("Undefined function or variable '", name, "'."));
+    if (withParentheses)
+        throw CalcError(errorid::undefinedFunction, joinText("Undefined function '", name, "'."));
+    throw CalcError(errorid::undefinedName,
+                    joinText("Undefined function or variable '", name, "'."));
 }
 
 Value Evaluator::evaluate(const Expr& expr) {
     return std::visit(
         Overloaded{
-            [&](const NumberLiteral& number) { return Value::fresh(host::makeDoubleScalar(number.value)); },
+            [&](const NumberLiteral& number) {
+                return Value::fresh(host::makeDoubleScalar(number.value));
+            },
             [&](const NameRef& name) {
                 if (const zqArray_tag* array = variable(name.name)) return Value::borrowed(*array);
                 return Value::fresh(std::move(call(name.name, {}, false, 1).front()));
@@ -198,9 +212,11 @@ Value Evaluator::evaluate(const Expr& expr) {
             [&](const UnaryOp& unary) {
                 const Value operand = evaluate(*unary.operand);
                 switch (unary.op) {
-                case UnaryOperator::Transpose: return Value::fresh(transposeArray(operand.array(), true));
-                case UnaryOperator::DotTranspose: return Value::fresh(transposeArray(operand.array(), false));
-                default: return Value::fresh(applySign(unary.op, operand.array()));
+                    case UnaryOperator::Transpose:
+                        return Value::fresh(transposeArray(operand.array(), true));
+                    case UnaryOperator::DotTranspose:
+                        return Value::fresh(transposeArray(operand.array(), false));
+                    default: return Value::fresh(applySign(unary.op, operand.array()));
                 }
             },
             [&](const BinaryOp& binary) {
@@ -210,9 +226,11 @@ Value Evaluator::evaluate(const Expr& expr) {
             },
             [&](const RangeExpr& range) { return evaluateRange(range); },
             [&](const CallExpr& callExpr) {
-                zqArraySlot result = std::move(call(callExpr.name, callExpr.arguments, true, 1).front());
+                zqArraySlot result =
+                    std::move(call(callExpr.name, callExpr.arguments, true, 1).front());
                 if (!result) {
-                    throw CalcError(errorid::noOutput, joinText("The call of ", callExpr.name, " gave no value."));
+                    throw CalcError(errorid::noOutput,
+                                    joinText("The call of ", callExpr.name, " gave no value."));
                 }
                 return Value::fresh(std::move(result));
             },
@@ -239,22 +257,26 @@ Value Evaluator::evaluateArrayLiteral(const ArrayLiteral& literal) {
         std::vector<const zqArray_tag*> elements(rows.size() * columns);
         for (std::size_t r = 0; r < rows.size(); ++r) {
             if (rows[r].size() != columns) {
-                throw CalcError(errorid::sizeMismatch, "The rows of a cell array must have one number of elements.");
+                throw CalcError(errorid::sizeMismatch,
+                                "The rows of a cell array must have one number of elements.");
             }
-            for (std::size_t c = 0; c < columns; ++c) elements[r + c * rows.size()] = &rows[r][c].array();
+            for (std::size_t c = 0; c < columns; ++c)
+                elements[r + c * rows.size()] = &rows[r][c].array();
         }
         return Value::fresh(makeCell({rows.size(), columns}, elements));
     }
 
     if (rows.empty()) return Value::fresh(filledArray(zqDoubleClass, {0, 0}, 0));
     std::vector<Value> joinedRows;
-    for (const std::vector<Value>& row : rows) joinedRows.push_back(Value::fresh(concatenate(1, arraysOf(row))));
+    for (const std::vector<Value>& row : rows)
+        joinedRows.push_back(Value::fresh(concatenate(1, arraysOf(row))));
     return Value::fresh(concatenate(0, arraysOf(joinedRows)));
 }
 
 Value Evaluator::evaluateRange(const RangeExpr& range) {
     const Value first = evaluate(*range.first);
-    const std::optional<Value> step = range.step ? std::optional<Value>(evaluate(*range.step)) : std::nullopt;
+    const std::optional<Value> step =
+        range.step ? std::optional<Value>(evaluate(*range.step)) : std::nullopt;
     const Value last = evaluate(*range.last);
     const std::optional<double> from = rangeOperand(first.array());
     const std::optional<double> by = step ? rangeOperand(step->array()) : 1.0;

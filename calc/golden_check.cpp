@@ -48,7 +48,8 @@ std::vector<GoldenCase> parseCases(std::string_view content) {
             cases.back().statements += line.substr(line.starts_with(".. ") ? 3 : 2);
         } else {
             continuing = false;
-            if (line.find_first_not_of(" \t") == std::string::npos || line.starts_with("%")) continue;
+            if (line.find_first_not_of(" \t") == std::string::npos || line.starts_with("%"))
+                continue;
             if (cases.empty()) {
                 cases.push_back({i + 1, "", {}});  // output with no statement fails the check
             }
@@ -60,7 +61,8 @@ std::vector<GoldenCase> parseCases(std::string_view content) {
 
 }  // namespace
 
-GoldenResult checkGoldenCases(std::string_view content, std::string_view fileName, std::ostream& report) {
+GoldenResult checkGoldenCases(std::string_view content, std::string_view fileName,
+                              std::ostream& report) {
     GoldenResult result;
     std::ostringstream output;
     const auto display = makeCanonicalDisplay(output);
@@ -73,7 +75,8 @@ GoldenResult checkGoldenCases(std::string_view content, std::string_view fileNam
         if (actual == goldenCase.expected) continue;
         ++result.failures;
         report << fileName << ":" << goldenCase.line << ": >> " << goldenCase.statements << "\n";
-        for (const std::string& line : goldenCase.expected) report << "  expected: " << line << "\n";
+        for (const std::string& line : goldenCase.expected)
+            report << "  expected: " << line << "\n";
         for (const std::string& line : actual) report << "  actual:   " << line << "\n";
     }
     return result;

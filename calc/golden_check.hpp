@@ -22,6 +22,7 @@ struct GoldenResult {
 
 // Runs the cases of `content` and reports each mismatch on `report` as
 // "FILE:LINE: ..." with the expected and the actual lines.
-GoldenResult checkGoldenCases(std::string_view content, std::string_view fileName, std::ostream& report);
+GoldenResult checkGoldenCases(std::string_view content, std::string_view fileName,
+                              std::ostream& report);
 
 }  // namespace bitcalc

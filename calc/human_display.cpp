@@ -39,12 +39,12 @@ std::string cellElementSummary(const zqArray_tag& element) {
 
 std::string elementText(const zqArray_tag& array, std::size_t index) {
     switch (host::classOf(array)) {
-    case zqStringClass: {
-        const auto text = host::stringElement(array, index);
-        return text ? humanQuoted(*text, '"') : "<missing>";
-    }
-    case zqCellClass: return cellElementSummary(*host::cellElement(array, index));
-    default: return numberText(array, index, NumberStyle::Human);
+        case zqStringClass: {
+            const auto text = host::stringElement(array, index);
+            return text ? humanQuoted(*text, '"') : "<missing>";
+        }
+        case zqCellClass: return cellElementSummary(*host::cellElement(array, index));
+        default: return numberText(array, index, NumberStyle::Human);
     }
 }
 
@@ -91,12 +91,14 @@ public:
     }
 
 private:
-    void showPage(const zqArray_tag& array, std::size_t rows, std::size_t columns, std::size_t first) {
+    void showPage(const zqArray_tag& array, std::size_t rows, std::size_t columns,
+                  std::size_t first) {
         if (host::classOf(array) == zqCharClass) {
             const char16_t* units = elementsOf<char16_t>(array) + first;
             for (std::size_t row = 0; row < rows; ++row) {
                 std::u16string text;
-                for (std::size_t column = 0; column < columns; ++column) text.push_back(units[row + column * rows]);
+                for (std::size_t column = 0; column < columns; ++column)
+                    text.push_back(units[row + column * rows]);
                 out_ << indent << humanQuoted(text, '\'') << '\n';
             }
             return;
@@ -110,8 +112,11 @@ private:
             texts[i] = elementText(array, first + i);
             widths[i / rows] = std::max(widths[i / rows], texts[i].size());
         }
-        const bool alignLeft = host::classOf(array) == zqStringClass || host::classOf(array) == zqCellClass;
-        if (!alignLeft) std::fill(widths.begin(), widths.end(), *std::max_element(widths.begin(), widths.end()));
+        const bool alignLeft =
+            host::classOf(array) == zqStringClass || host::classOf(array) == zqCellClass;
+        if (!alignLeft)
+            std::fill(widths.begin(), widths.end(),
+                      *std::max_element(widths.begin(), widths.end()));
         std::vector<std::size_t> blockStarts;
         std::size_t used = 0;
         for (std::size_t column = 0; column < columns; ++column) {

@@ -20,44 +20,42 @@ bool isBlank(char c) { return c == ' ' || c == '\t' || c == '\r' || c == '\f' ||
 // an element.
 bool endsValue(TokenKind kind) {
     switch (kind) {
-    case TokenKind::Number:
-    case TokenKind::Identifier:
-    case TokenKind::CharText:
-    case TokenKind::StringText:
-    case TokenKind::RightParen:
-    case TokenKind::RightBracket:
-    case TokenKind::RightBrace:
-    case TokenKind::Transpose:
-    case TokenKind::DotTranspose:
-        return true;
-    default:
-        return false;
+        case TokenKind::Number:
+        case TokenKind::Identifier:
+        case TokenKind::CharText:
+        case TokenKind::StringText:
+        case TokenKind::RightParen:
+        case TokenKind::RightBracket:
+        case TokenKind::RightBrace:
+        case TokenKind::Transpose:
+        case TokenKind::DotTranspose: return true;
+        default: return false;
     }
 }
 
 std::string_view symbolOf(TokenKind kind) {
     switch (kind) {
-    case TokenKind::Plus: return "+";
-    case TokenKind::Minus: return "-";
-    case TokenKind::Star: return "*";
-    case TokenKind::Slash: return "/";
-    case TokenKind::Caret: return "^";
-    case TokenKind::DotStar: return ".*";
-    case TokenKind::DotSlash: return "./";
-    case TokenKind::DotCaret: return ".^";
-    case TokenKind::Transpose: return "'";
-    case TokenKind::DotTranspose: return ".'";
-    case TokenKind::LeftParen: return "(";
-    case TokenKind::RightParen: return ")";
-    case TokenKind::LeftBracket: return "[";
-    case TokenKind::RightBracket: return "]";
-    case TokenKind::LeftBrace: return "{";
-    case TokenKind::RightBrace: return "}";
-    case TokenKind::Comma: return ",";
-    case TokenKind::Semicolon: return ";";
-    case TokenKind::Assign: return "=";
-    case TokenKind::Colon: return ":";
-    default: return "";
+        case TokenKind::Plus: return "+";
+        case TokenKind::Minus: return "-";
+        case TokenKind::Star: return "*";
+        case TokenKind::Slash: return "/";
+        case TokenKind::Caret: return "^";
+        case TokenKind::DotStar: return ".*";
+        case TokenKind::DotSlash: return "./";
+        case TokenKind::DotCaret: return ".^";
+        case TokenKind::Transpose: return "'";
+        case TokenKind::DotTranspose: return ".'";
+        case TokenKind::LeftParen: return "(";
+        case TokenKind::RightParen: return ")";
+        case TokenKind::LeftBracket: return "[";
+        case TokenKind::RightBracket: return "]";
+        case TokenKind::LeftBrace: return "{";
+        case TokenKind::RightBrace: return "}";
+        case TokenKind::Comma: return ",";
+        case TokenKind::Semicolon: return ";";
+        case TokenKind::Assign: return "=";
+        case TokenKind::Colon: return ":";
+        default: return "";
     }
 }
 
@@ -65,13 +63,13 @@ std::string_view symbolOf(TokenKind kind) {
 
 std::string describe(const Token& token) {
     switch (token.kind) {
-    case TokenKind::Number: return joinText("number ", token.text);
-    case TokenKind::Identifier: return joinText("name '", token.text, "'");
-    case TokenKind::CharText: return joinText("text '", toUtf8(token.units), "'");
-    case TokenKind::StringText: return joinText("string \"", toUtf8(token.units), "\"");
-    case TokenKind::Newline: return "end of line";
-    case TokenKind::End: return "end of input";
-    default: return joinText("'", symbolOf(token.kind), "'");
+        case TokenKind::Number: return joinText("number ", token.text);
+        case TokenKind::Identifier: return joinText("name '", token.text, "'");
+        case TokenKind::CharText: return joinText("text '", toUtf8(token.units), "'");
+        case TokenKind::StringText: return joinText("string \"", toUtf8(token.units), "\"");
+        case TokenKind::Newline: return "end of line";
+        case TokenKind::End: return "end of input";
+        default: return joinText("'", symbolOf(token.kind), "'");
     }
 }
 
@@ -149,7 +147,8 @@ Token Lexer::next() {
     Token token;
     if (here_.offset >= source_.size()) {
         token = make(TokenKind::End, start);
-    } else if (blank && insideArrayBrackets() && endsValue(previous_) && startsElementAfterBlank()) {
+    } else if (blank && insideArrayBrackets() && endsValue(previous_) &&
+               startsElementAfterBlank()) {
         token = make(TokenKind::Comma, start);
     } else {
         const char c = peekChar();
@@ -198,8 +197,8 @@ Token Lexer::lexNumber() {
     Token token = make(TokenKind::Number, start);
     token.text = std::string(source_.substr(start.offset, here_.offset - start.offset));
     if (isNameChar(peekChar())) {
-        fail(here_, joinText("expected an operator or a separator after the number ", token.text, ", found ",
-                             describeCharacterAt(source_, here_.offset)));
+        fail(here_, joinText("expected an operator or a separator after the number ", token.text,
+                             ", found ", describeCharacterAt(source_, here_.offset)));
     }
     // strtod reads the decimal form exactly, overflowing to Inf and
     // underflowing through the subnormals to 0.
@@ -258,34 +257,33 @@ Token Lexer::lexOperator() {
         return single(kind);
     };
     switch (c) {
-    case '+': return single(TokenKind::Plus);
-    case '-': return single(TokenKind::Minus);
-    case '*': return single(TokenKind::Star);
-    case '/': return single(TokenKind::Slash);
-    case '^': return single(TokenKind::Caret);
-    case ':': return single(TokenKind::Colon);
-    case ',': return single(TokenKind::Comma);
-    case ';': return single(TokenKind::Semicolon);
-    case '=': return single(TokenKind::Assign);
-    case '(': return opening(TokenKind::LeftParen, Bracket::Paren);
-    case '[': return opening(TokenKind::LeftBracket, Bracket::Square);
-    case '{': return opening(TokenKind::LeftBrace, Bracket::Brace);
-    case ')': return closing(TokenKind::RightParen);
-    case ']': return closing(TokenKind::RightBracket);
-    case '}': return closing(TokenKind::RightBrace);
-    case '.': {
-        const char after = peekChar(1);
-        const TokenKind kind = after == '*'    ? TokenKind::DotStar
-                               : after == '/'  ? TokenKind::DotSlash
-                               : after == '^'  ? TokenKind::DotCaret
-                               : after == '\'' ? TokenKind::DotTranspose
-                                               : TokenKind::End;
-        if (kind == TokenKind::End) fail(start, "unexpected '.'");
-        advance();
-        return single(kind);
-    }
-    default:
-        break;
+        case '+': return single(TokenKind::Plus);
+        case '-': return single(TokenKind::Minus);
+        case '*': return single(TokenKind::Star);
+        case '/': return single(TokenKind::Slash);
+        case '^': return single(TokenKind::Caret);
+        case ':': return single(TokenKind::Colon);
+        case ',': return single(TokenKind::Comma);
+        case ';': return single(TokenKind::Semicolon);
+        case '=': return single(TokenKind::Assign);
+        case '(': return opening(TokenKind::LeftParen, Bracket::Paren);
+        case '[': return opening(TokenKind::LeftBracket, Bracket::Square);
+        case '{': return opening(TokenKind::LeftBrace, Bracket::Brace);
+        case ')': return closing(TokenKind::RightParen);
+        case ']': return closing(TokenKind::RightBracket);
+        case '}': return closing(TokenKind::RightBrace);
+        case '.': {
+            const char after = peekChar(1);
+            const TokenKind kind = after == '*'    ? TokenKind::DotStar
+                                   : after == '/'  ? TokenKind::DotSlash
+                                   : after == '^'  ? TokenKind::DotCaret
+                                   : after == '\'' ? TokenKind::DotTranspose
+                                                   : TokenKind::End;
+            if (kind == TokenKind::End) fail(start, "unexpected '.'");
+            advance();
+            return single(kind);
+        }
+        default: break;
     }
     fail(start, joinText("unexpected character ", describeCharacterAt(source_, start.offset)));
 }

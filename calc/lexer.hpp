@@ -49,8 +49,8 @@ enum class TokenKind {
 struct Token {
     TokenKind kind = TokenKind::End;
     SourcePos pos;
-    std::string text;       // identifier, or the source spelling of a number
-    std::u16string units;   // contents of a text literal
+    std::string text;      // identifier, or the source spelling of a number
+    std::u16string units;  // contents of a text literal
     double number = 0;
 };
 

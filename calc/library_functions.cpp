@@ -31,7 +31,8 @@ std::span<const LibraryFunction> loadedLibraryFunctions() {
     return functions;
 }
 
-const LibraryFunction* findLibraryFunction(std::span<const LibraryFunction> functions, std::string_view name) {
+const LibraryFunction* findLibraryFunction(std::span<const LibraryFunction> functions,
+                                           std::string_view name) {
     for (const LibraryFunction& function : functions) {
         if (function.name == name) return &function;
     }

@@ -20,6 +20,7 @@ struct LibraryFunction {
 std::span<const LibraryFunction> loadedLibraryFunctions();
 
 // The function of that name in `functions`, or null.
-const LibraryFunction* findLibraryFunction(std::span<const LibraryFunction> functions, std::string_view name);
+const LibraryFunction* findLibraryFunction(std::span<const LibraryFunction> functions,
+                                           std::string_view name);
 
 }  // namespace bitcalc

@@ -130,7 +130,8 @@ int checkFiles(const std::vector<std::string>& files) {
             continue;
         }
         const bitcalc::GoldenResult result = bitcalc::checkGoldenCases(*content, file, std::cout);
-        std::cout << file << ": " << result.cases - result.failures << " of " << result.cases << " cases passed\n";
+        std::cout << file << ": " << result.cases - result.failures << " of " << result.cases
+                  << " cases passed\n";
         passed = passed && result.failures == 0;
     }
     return passed ? exitClean : exitError;
@@ -140,7 +141,8 @@ int checkFiles(const std::vector<std::string>& files) {
 bool runInteractively(bitcalc::Evaluator& evaluator, bool keepGoing) {
     bool clean = true;
     std::string pending;
-    while (const std::optional<std::string> line = bitcalc::readTerminalLine(pending.empty() ? ">> " : ".. ")) {
+    while (const std::optional<std::string> line =
+               bitcalc::readTerminalLine(pending.empty() ? ">> " : ".. ")) {
         pending += *line;
         pending += '\n';
         if (bitcalc::needsMoreInput(pending)) continue;
@@ -153,8 +155,8 @@ bool runInteractively(bitcalc::Evaluator& evaluator, bool keepGoing) {
 }
 
 int run(const Options& options) {
-    const auto display =
-        options.canonical ? bitcalc::makeCanonicalDisplay(std::cout) : bitcalc::makeHumanDisplay(std::cout, std::cerr);
+    const auto display = options.canonical ? bitcalc::makeCanonicalDisplay(std::cout)
+                                           : bitcalc::makeHumanDisplay(std::cout, std::cerr);
     bitcalc::Evaluator evaluator(*display);
     bool clean = true;
     if (options.statements) {
@@ -207,7 +209,8 @@ int main(int argc, char** argv) {
         if (options.statements) return usageError("--check takes files, not -e");
         return checkFiles(options.files);
     }
-    if (options.statements && !options.files.empty()) return usageError("give either -e or a file, not both");
+    if (options.statements && !options.files.empty())
+        return usageError("give either -e or a file, not both");
     if (options.files.size() > 1) return usageError("give one file to evaluate");
     try {
         return run(options);

@@ -58,7 +58,8 @@ template <class F>
 std::string shortestOf(F value) {
     if (!std::isfinite(value)) return nonFiniteText(value);
     char buffer[64];
-    const auto written = std::to_chars(buffer, buffer + sizeof buffer, value, std::chars_format::scientific);
+    const auto written =
+        std::to_chars(buffer, buffer + sizeof buffer, value, std::chars_format::scientific);
     const std::string_view scientific(buffer, static_cast<std::size_t>(written.ptr - buffer));
 
     const std::size_t e = scientific.find('e');
@@ -84,8 +85,8 @@ std::string shortestOf(F value) {
         const auto point = static_cast<std::size_t>(exponent + 1);
         plain = joinText(digits.substr(0, point), ".", digits.substr(point));
     }
-    const std::string exponential =
-        joinText(digits.substr(0, 1), count > 1 ? "." : "", digits.substr(1), "e", std::to_string(exponent));
+    const std::string exponential = joinText(digits.substr(0, 1), count > 1 ? "." : "",
+                                             digits.substr(1), "e", std::to_string(exponent));
 
     const std::string& shorter = exponential.size() < plain.size() ? exponential : plain;
     return joinText(negative ? "-" : "", shorter);

@@ -24,8 +24,7 @@ std::string canonicalText(float value);
 
 // Integers and logicals: their decimal value (a char-sized integer too).
 template <class T>
-    requires std::is_integral_v<T>
-std::string canonicalText(T value) {
+requires std::is_integral_v<T> std::string canonicalText(T value) {
     if constexpr (std::is_same_v<T, bool>) {
         return value ? "1" : "0";
     } else if constexpr (std::is_signed_v<T>) {

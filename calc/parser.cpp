@@ -39,8 +39,8 @@ int heightBelow(const ArrayLiteral& node) {
 }
 
 bool endsStatement(TokenKind kind) {
-    return kind == TokenKind::Comma || kind == TokenKind::Semicolon ||
-           kind == TokenKind::Newline || kind == TokenKind::End;
+    return kind == TokenKind::Comma || kind == TokenKind::Semicolon || kind == TokenKind::Newline ||
+           kind == TokenKind::End;
 }
 
 }  // namespace
@@ -153,21 +153,17 @@ bool Parser::startsMultipleAssignment() {
     int depth = 0;
     for (std::size_t i = 0;; ++i) {
         switch (peek(i).kind) {
-        case TokenKind::LeftBracket:
-        case TokenKind::LeftParen:
-        case TokenKind::LeftBrace:
-            ++depth;
-            break;
-        case TokenKind::RightBracket:
-        case TokenKind::RightParen:
-        case TokenKind::RightBrace:
-            if (--depth == 0) return peek(i + 1).kind == TokenKind::Assign;
-            break;
-        case TokenKind::Newline:
-        case TokenKind::End:
-            return false;
-        default:
-            break;
+            case TokenKind::LeftBracket:
+            case TokenKind::LeftParen:
+            case TokenKind::LeftBrace: ++depth; break;
+            case TokenKind::RightBracket:
+            case TokenKind::RightParen:
+            case TokenKind::RightBrace:
+                if (--depth == 0) return peek(i + 1).kind == TokenKind::Assign;
+                break;
+            case TokenKind::Newline:
+            case TokenKind::End: return false;
+            default: break;
         }
     }
 }
@@ -178,7 +174,8 @@ ExprPtr Parser::parseExpression() {
     if (!at(TokenKind::Colon)) return first;
     take();
     ExprPtr second = parseAdditive();
-    if (!at(TokenKind::Colon)) return makeExpr(pos, RangeExpr{std::move(first), nullptr, std::move(second)});
+    if (!at(TokenKind::Colon))
+        return makeExpr(pos, RangeExpr{std::move(first), nullptr, std::move(second)});
     take();
     ExprPtr third = parseAdditive();
     return makeExpr(pos, RangeExpr{std::move(first), std::move(second), std::move(third)});
@@ -219,7 +216,8 @@ ExprPtr Parser::parseUnary() {
     const Token op = take();
     NestingGuard guard(*this, op);
     ExprPtr operand = parseUnary();
-    const UnaryOperator unary = op.kind == TokenKind::Minus ? UnaryOperator::Negate : UnaryOperator::Plus;
+    const UnaryOperator unary =
+        op.kind == TokenKind::Minus ? UnaryOperator::Negate : UnaryOperator::Plus;
     return makeExpr(op.pos, UnaryOp{unary, std::move(operand)});
 }
 
@@ -228,7 +226,8 @@ ExprPtr Parser::parsePowerChain() {
     while (at(TokenKind::Caret) || at(TokenKind::DotCaret)) {
         const Token op = take();
         ExprPtr exponent = parsePowerOperand();
-        base = makeExpr(op.pos, BinaryOp{BinaryOperator::Power, std::move(base), std::move(exponent)});
+        base =
+            makeExpr(op.pos, BinaryOp{BinaryOperator::Power, std::move(base), std::move(exponent)});
     }
     return base;
 }
@@ -239,7 +238,8 @@ ExprPtr Parser::parsePowerOperand() {
     const Token op = take();
     NestingGuard guard(*this, op);
     ExprPtr operand = parsePowerOperand();
-    const UnaryOperator unary = op.kind == TokenKind::Minus ? UnaryOperator::Negate : UnaryOperator::Plus;
+    const UnaryOperator unary =
+        op.kind == TokenKind::Minus ? UnaryOperator::Negate : UnaryOperator::Plus;
     return makeExpr(op.pos, UnaryOp{unary, std::move(operand)});
 }
 
@@ -247,8 +247,8 @@ ExprPtr Parser::parsePostfix() {
     ExprPtr operand = parsePrimary();
     while (at(TokenKind::Transpose) || at(TokenKind::DotTranspose)) {
         const Token op = take();
-        const UnaryOperator unary =
-            op.kind == TokenKind::Transpose ? UnaryOperator::Transpose : UnaryOperator::DotTranspose;
+        const UnaryOperator unary = op.kind == TokenKind::Transpose ? UnaryOperator::Transpose
+                                                                    : UnaryOperator::DotTranspose;
         operand = makeExpr(op.pos, UnaryOp{unary, std::move(operand)});
     }
     return operand;
@@ -257,37 +257,36 @@ ExprPtr Parser::parsePostfix() {
 ExprPtr Parser::parsePrimary() {
     const Token& token = peek();
     switch (token.kind) {
-    case TokenKind::Number: {
-        const Token number = take();
-        return makeExpr(number.pos, NumberLiteral{number.number});
-    }
-    case TokenKind::Identifier: {
-        const Token name = take();
-        if (at(TokenKind::LeftParen)) return parseCall(name);
-        return makeExpr(name.pos, NameRef{name.text});
-    }
-    case TokenKind::CharText: {
-        Token text = take();
-        return makeExpr(text.pos, CharLiteral{std::move(text.units)});
-    }
-    case TokenKind::StringText: {
-        Token text = take();
-        return makeExpr(text.pos, StringLiteral{std::move(text.units)});
-    }
-    case TokenKind::LeftParen: {
-        const Token open = take();
-        NestingGuard guard(*this, open);
-        ExprPtr inner = parseExpression();
-        expect(TokenKind::RightParen, "')'");
-        return inner;
-    }
-    case TokenKind::LeftBracket:
-    case TokenKind::LeftBrace: {
-        const Token open = take();
-        return parseArrayLiteral(open);
-    }
-    default:
-        fail(token, "a value");
+        case TokenKind::Number: {
+            const Token number = take();
+            return makeExpr(number.pos, NumberLiteral{number.number});
+        }
+        case TokenKind::Identifier: {
+            const Token name = take();
+            if (at(TokenKind::LeftParen)) return parseCall(name);
+            return makeExpr(name.pos, NameRef{name.text});
+        }
+        case TokenKind::CharText: {
+            Token text = take();
+            return makeExpr(text.pos, CharLiteral{std::move(text.units)});
+        }
+        case TokenKind::StringText: {
+            Token text = take();
+            return makeExpr(text.pos, StringLiteral{std::move(text.units)});
+        }
+        case TokenKind::LeftParen: {
+            const Token open = take();
+            NestingGuard guard(*this, open);
+            ExprPtr inner = parseExpression();
+            expect(TokenKind::RightParen, "')'");
+            return inner;
+        }
+        case TokenKind::LeftBracket:
+        case TokenKind::LeftBrace: {
+            const Token open = take();
+            return parseArrayLiteral(open);
+        }
+        default: fail(token, "a value");
     }
 }
 
@@ -344,7 +343,8 @@ ExprPtr Parser::parseCall(const Token& name) {
 bool needsMoreInput(std::string_view source) {
     Parser parser(source);
     while (std::optional<ParsedItem> item = parser.next()) {
-        if (const auto* error = std::get_if<SyntaxError>(&*item); error && error->atEnd) return true;
+        if (const auto* error = std::get_if<SyntaxError>(&*item); error && error->atEnd)
+            return true;
     }
     return false;
 }

@@ -28,7 +28,8 @@ std::vector<CallRecord> calls;
 
 void record(int nlhs, int nrhs, const zqArray_tag** prhs) {
     CallRecord call{nlhs, {}};
-    for (int i = 0; i < nrhs; ++i) call.flagged.push_back((prhs[i]->flags & zqSharedResultFlag) != 0);
+    for (int i = 0; i < nrhs; ++i)
+        call.flagged.push_back((prhs[i]->flags & zqSharedResultFlag) != 0);
     calls.push_back(call);
 }
 
@@ -39,9 +40,11 @@ void increment(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) 
     record(nlhs, nrhs, prhs);
     if (nrhs == 0) host::raiseHostError("VESPRA", "minrhs");
     const zqArray_tag* first = prhs[0];
-    if (host::classOf(*first) != zqDoubleClass || host::isComplex(*first)) host::raiseHostError("VESPRA:bitcmp", "firstArgNotInt");
-    zqArraySlot result((first->flags & zqSharedResultFlag) ? matrix::detail::shared_copy(first)
-                                                          : host::makeArray(zqDoubleClass, host::dimensions(*first)).release());
+    if (host::classOf(*first) != zqDoubleClass || host::isComplex(*first))
+        host::raiseHostError("VESPRA:bitcmp", "firstArgNotInt");
+    zqArraySlot result((first->flags & zqSharedResultFlag)
+                           ? matrix::detail::shared_copy(first)
+                           : host::makeArray(zqDoubleClass, host::dimensions(*first)).release());
     for (std::size_t i = 0, n = host::elementCount(*first); i < n; ++i) {
         static_cast<double*>(result->data)[i] = static_cast<const double*>(first->data)[i] + 1;
     }
@@ -50,7 +53,9 @@ void increment(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) 
 }
 
 // Gives no output at all.
-void silent(int nlhs, zqArraySlot*, int nrhs, const zqArray_tag** prhs) { record(nlhs, nrhs, prhs); }
+void silent(int nlhs, zqArraySlot*, int nrhs, const zqArray_tag** prhs) {
+    record(nlhs, nrhs, prhs);
+}
 
 const LibraryFunction fakeFunctions[] = {
     {"bitcmp", &increment}, {"bitset", &silent}, {"bitget", nullptr}};
@@ -133,23 +138,31 @@ struct HumanCase {
 
 class HumanDisplay : public testing::TestWithParam<HumanCase> {};
 
-TEST_P(HumanDisplay, LaysValuesOutByRowsAndColumns) { EXPECT_EQ(humanText(GetParam().source), GetParam().shown); }
+TEST_P(HumanDisplay, LaysValuesOutByRowsAndColumns) {
+    EXPECT_EQ(humanText(GetParam().source), GetParam().shown);
+}
 
 INSTANTIATE_TEST_SUITE_P(
     Layouts, HumanDisplay,
     testing::Values(
         HumanCase{"x = uint8([1 2 255])", "x = 1x3 uint8\n    1    2  255\n"},
-        HumanCase{"[1 2.5; -3 2^64]", "ans = 2x2 double\n                     1                   2.5\n                    -3  18446744073709551616\n"},
+        HumanCase{"[1 2.5; -3 2^64]",
+                  "ans = 2x2 double\n                     1                   2.5\n                "
+                  "    -3  18446744073709551616\n"},
         HumanCase{"zeros(1, 2, 2)", "ans = 1x2x2 double\n  (:,:,1)\n  0  0\n  (:,:,2)\n  0  0\n"},
         HumanCase{"['ab'; 'cd']", "ans = 2x2 char\n  'ab'\n  'cd'\n"},
         HumanCase{"zeros(0, 3)", "ans = 0x3 double\n  []\n"},
         HumanCase{"{1, 'a', {}, [1 2]}", "ans = 1x4 cell\n  [1]  'a'  {0x0 cell}  [1x2 double]\n"},
         HumanCase{"[\"a\" string(missing)]", "ans = 1x2 string\n  \"a\"  <missing>\n"},
-        HumanCase{"complex(1, -2), sparse(true)", "ans = 1x1 double complex\n  1-2i\nans = 1x1 logical sparse\n  1\n"},
+        HumanCase{"complex(1, -2), sparse(true)",
+                  "ans = 1x1 double complex\n  1-2i\nans = 1x1 logical sparse\n  1\n"},
         HumanCase{"1e300, NaN", "ans = 1x1 double\n  1e300\nans = 1x1 double\n  NaN\n"},
         HumanCase{"1:12", "ans = 1x12 double\n   1   2   3   4   5   6   7   8   9  10  11  12\n"},
-        HumanCase{"zeros(-1)", "error: zeros: sizes must be whole numbers from 0 up, not -1. (bitcalc:invalidArgument)\n"},
-        HumanCase{"bitcmp(", "error: 1:8: expected a value, found end of input (bitcalc:syntax)\n"}));
+        HumanCase{"zeros(-1)",
+                  "error: zeros: sizes must be whole numbers from 0 up, not -1. "
+                  "(bitcalc:invalidArgument)\n"},
+        HumanCase{"bitcmp(",
+                  "error: 1:8: expected a value, found end of input (bitcalc:syntax)\n"}));
 
 TEST(HumanDisplay, WrapsLongRowsIntoColumnBlocks) {
     const std::string shown = humanText("1:30");
@@ -161,8 +174,9 @@ TEST(Memory, NoArrayOutlivesTheEvaluator) {
     const std::size_t before = host::liveArrayCount();
     {
         Session session;
-        session.run("x = {1, 'a', \"s\", {2}}; y = [x x]; z = bitcmp([1 2]); w = complex(int8(1), 2)'; "
-                    "bad = [1 'a']; q = reshape(1:6, 4, []); bitset(1); r = bitcmp(bitcmp(x))");
+        session.run(
+            "x = {1, 'a', \"s\", {2}}; y = [x x]; z = bitcmp([1 2]); w = complex(int8(1), 2)'; "
+            "bad = [1 'a']; q = reshape(1:6, 4, []); bitset(1); r = bitcmp(bitcmp(x))");
     }
     EXPECT_EQ(host::liveArrayCount(), before);
 }
@@ -175,9 +189,9 @@ public:
 
     std::string statement() {
         switch (pick(4)) {
-        case 0: return joinText(name(), " = ", expression(3));
-        case 1: return joinText("[a, b] = ", call(3));
-        default: return expression(3);
+            case 0: return joinText(name(), " = ", expression(3));
+            case 1: return joinText("[a, b] = ", call(3));
+            default: return expression(3);
         }
     }
 
@@ -189,21 +203,24 @@ private:
     std::string expression(int depth) {
         if (depth == 0) return atom();
         switch (pick(9)) {
-        case 0: return joinText(expression(depth - 1), " ", "+-*/^"[pick(5)], " ", expression(depth - 1));
-        case 1: return joinText("-", expression(depth - 1));
-        case 2: return joinText("[", expression(depth - 1), " ", expression(depth - 1), "; ", expression(depth - 1), " ",
-                                expression(depth - 1), "]");
-        case 3: return joinText("{", expression(depth - 1), ", ", expression(depth - 1), "}");
-        case 4: return joinText(expression(depth - 1), ":", expression(depth - 1));
-        case 5: return joinText("(", expression(depth - 1), ")'");
-        default: return call(depth);
+            case 0:
+                return joinText(expression(depth - 1), " ", "+-*/^"[pick(5)], " ",
+                                expression(depth - 1));
+            case 1: return joinText("-", expression(depth - 1));
+            case 2:
+                return joinText("[", expression(depth - 1), " ", expression(depth - 1), "; ",
+                                expression(depth - 1), " ", expression(depth - 1), "]");
+            case 3: return joinText("{", expression(depth - 1), ", ", expression(depth - 1), "}");
+            case 4: return joinText(expression(depth - 1), ":", expression(depth - 1));
+            case 5: return joinText("(", expression(depth - 1), ")'");
+            default: return call(depth);
         }
     }
 
     std::string call(int depth) {
-        static const char* functions[] = {"int8",  "uint64", "single", "logical", "double", "zeros",   "ones",
-                                          "reshape", "sparse", "complex", "string", "intmax", "bitcmp", "bitget",
-                                          "true",  "NaN"};
+        static const char* functions[] = {
+            "int8",   "uint64",  "single", "logical", "double", "zeros",  "ones", "reshape",
+            "sparse", "complex", "string", "intmax",  "bitcmp", "bitget", "true", "NaN"};
         std::string text = joinText(functions[pick(std::size(functions))], "(");
         for (std::size_t i = 0, count = pick(4); i < count; ++i) {
             text += joinText(i ? ", " : "", depth > 0 ? expression(depth - 1) : atom());
@@ -212,8 +229,9 @@ private:
     }
 
     std::string atom() {
-        static const char* atoms[] = {"0",  "1",  "2",   "3",       "-1",   "0.5",   "2^63", "1e300", "NaN", "Inf",
-                                      "[]", "''", "'int8'", "\"s\"", "true", "a",    "x",    "{}",    "missing", "1:3"};
+        static const char* atoms[] = {"0",     "1",   "2",   "3",  "-1",      "0.5",    "2^63",
+                                      "1e300", "NaN", "Inf", "[]", "''",      "'int8'", "\"s\"",
+                                      "true",  "a",   "x",   "{}", "missing", "1:3"};
         return atoms[pick(std::size(atoms))];
     }
 

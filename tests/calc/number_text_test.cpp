@@ -30,28 +30,30 @@ TEST_P(DoubleText, IsExactAndShortest) {
 
 INSTANTIATE_TEST_SUITE_P(
     Edges, DoubleText,
-    testing::Values(DoubleCase{0.5, "0.5"}, DoubleCase{-0.5, "-0.5"}, DoubleCase{2.5, "2.5"},
-                    DoubleCase{-2.5, "-2.5"}, DoubleCase{4503599627370495.5, "4503599627370495.5"},
-                    DoubleCase{0.1, "0.1"}, DoubleCase{1.0 / 3, "0.3333333333333333"},
-                    DoubleCase{123456.5, "123456.5"}, DoubleCase{0.0015, "0.0015"},
-                    DoubleCase{0.001, "1e-3"}, DoubleCase{1.5e-7, "1.5e-7"}, DoubleCase{1e-300, "1e-300"},
-                    DoubleCase{0.0, "0"}, DoubleCase{-0.0, "-0"}, DoubleCase{1.0, "1"}, DoubleCase{-1.0, "-1"},
-                    DoubleCase{9007199254740992.0, "9007199254740992"},
-                    DoubleCase{9007199254740994.0, "9007199254740994"},
-                    DoubleCase{0x1p63, "9223372036854775808"}, DoubleCase{-0x1p63, "-9223372036854775808"},
-                    DoubleCase{0x1p64, "18446744073709551616"},
-                    DoubleCase{18446744073709549568.0, "18446744073709549568"},
-                    DoubleCase{1e300, "1000000000000000052504760255204420248704468581108159154915854115511802457988908"
-                                      "1957863713750804478640437044438328838781769425232353604305756447921847867069828"
-                                      "4838720092657580373783023379478809005936895323497079994508111903896764088007465"
-                                      "2742780142494579258788820056842838115669472196386865459400540160"},
-                    DoubleCase{std::numeric_limits<double>::denorm_min(), "5e-324"},
-                    DoubleCase{-std::numeric_limits<double>::denorm_min(), "-5e-324"},
-                    DoubleCase{std::numeric_limits<double>::min(), "2.2250738585072014e-308"},
-                    DoubleCase{2.225073858507201e-308, "2.225073858507201e-308"},
-                    DoubleCase{std::numeric_limits<double>::quiet_NaN(), "NaN"},
-                    DoubleCase{std::numeric_limits<double>::infinity(), "Inf"},
-                    DoubleCase{-std::numeric_limits<double>::infinity(), "-Inf"}));
+    testing::Values(
+        DoubleCase{0.5, "0.5"}, DoubleCase{-0.5, "-0.5"}, DoubleCase{2.5, "2.5"},
+        DoubleCase{-2.5, "-2.5"}, DoubleCase{4503599627370495.5, "4503599627370495.5"},
+        DoubleCase{0.1, "0.1"}, DoubleCase{1.0 / 3, "0.3333333333333333"},
+        DoubleCase{123456.5, "123456.5"}, DoubleCase{0.0015, "0.0015"}, DoubleCase{0.001, "1e-3"},
+        DoubleCase{1.5e-7, "1.5e-7"}, DoubleCase{1e-300, "1e-300"}, DoubleCase{0.0, "0"},
+        DoubleCase{-0.0, "-0"}, DoubleCase{1.0, "1"}, DoubleCase{-1.0, "-1"},
+        DoubleCase{9007199254740992.0, "9007199254740992"},
+        DoubleCase{9007199254740994.0, "9007199254740994"},
+        DoubleCase{0x1p63, "9223372036854775808"}, DoubleCase{-0x1p63, "-9223372036854775808"},
+        DoubleCase{0x1p64, "18446744073709551616"},
+        DoubleCase{18446744073709549568.0, "18446744073709549568"},
+        DoubleCase{1e300,
+                   "1000000000000000052504760255204420248704468581108159154915854115511802457988908"
+                   "1957863713750804478640437044438328838781769425232353604305756447921847867069828"
+                   "4838720092657580373783023379478809005936895323497079994508111903896764088007465"
+                   "2742780142494579258788820056842838115669472196386865459400540160"},
+        DoubleCase{std::numeric_limits<double>::denorm_min(), "5e-324"},
+        DoubleCase{-std::numeric_limits<double>::denorm_min(), "-5e-324"},
+        DoubleCase{std::numeric_limits<double>::min(), "2.2250738585072014e-308"},
+        DoubleCase{2.225073858507201e-308, "2.225073858507201e-308"},
+        DoubleCase{std::numeric_limits<double>::quiet_NaN(), "NaN"},
+        DoubleCase{std::numeric_limits<double>::infinity(), "Inf"},
+        DoubleCase{-std::numeric_limits<double>::infinity(), "-Inf"}));
 
 TEST(DoubleText, LargestDoubleIsItsWholeInteger) {
     const std::string text = canonicalText(std::numeric_limits<double>::max());
@@ -67,14 +69,18 @@ struct SingleCase {
 
 class SingleText : public testing::TestWithParam<SingleCase> {};
 
-TEST_P(SingleText, IsShortestForItsOwnWidth) { EXPECT_EQ(canonicalText(GetParam().value), GetParam().text); }
+TEST_P(SingleText, IsShortestForItsOwnWidth) {
+    EXPECT_EQ(canonicalText(GetParam().value), GetParam().text);
+}
 
 INSTANTIATE_TEST_SUITE_P(
     Edges, SingleText,
     testing::Values(SingleCase{0.5f, "0.5"}, SingleCase{1.1f, "1.1"}, SingleCase{0.1f, "0.1"},
-                    SingleCase{-2.5f, "-2.5"}, SingleCase{-0.0f, "-0"}, SingleCase{16777216.0f, "16777216"},
-                    SingleCase{4194304.5f, "4194304.5"}, SingleCase{3e-5f, "3e-5"},
-                    SingleCase{std::numeric_limits<float>::max(), "340282346638528859811704183484516925440"},
+                    SingleCase{-2.5f, "-2.5"}, SingleCase{-0.0f, "-0"},
+                    SingleCase{16777216.0f, "16777216"}, SingleCase{4194304.5f, "4194304.5"},
+                    SingleCase{3e-5f, "3e-5"},
+                    SingleCase{std::numeric_limits<float>::max(),
+                               "340282346638528859811704183484516925440"},
                     SingleCase{std::numeric_limits<float>::denorm_min(), "1e-45"},
                     SingleCase{std::numeric_limits<float>::quiet_NaN(), "NaN"},
                     SingleCase{-std::numeric_limits<float>::infinity(), "-Inf"}));
