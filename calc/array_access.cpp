@@ -108,11 +108,6 @@ void setArraySizeLimit(std::size_t bytes) { arraySizeLimit = bytes; }
 bool isScalar(const zqArray_tag& array) { return host::elementCount(array) == 1; }
 bool isEmpty(const zqArray_tag& array) { return host::elementCount(array) == 0; }
 
-void setImaginaryPart(zqArray_tag& array, std::span<const std::byte> bytes) {
-    static const std::byte nothing{};
-    host::makeComplex(array, bytes.empty() ? std::span<const std::byte>(&nothing, 0) : bytes);
-}
-
 std::optional<std::u16string> textOf(const zqArray_tag& array) {
     const zqClassID cls = host::classOf(array);
     const Dims dims = host::dimensions(array);

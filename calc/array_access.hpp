@@ -56,10 +56,6 @@ T* mutableElementsOf(zqArray_tag& array) {
     return static_cast<T*>(array.data);
 }
 
-// Gives a numeric array the imaginary part `bytes` (see host::makeComplex);
-// an empty part is passed with a valid address, as the host copies it with
-// memcpy whatever its size.
-void setImaginaryPart(zqArray_tag& array, std::span<const std::byte> bytes);
 
 // The text that a char row vector, a 0-by-0 char array or a string scalar
 // holds; nothing for any other array, a missing string included.

@@ -83,7 +83,7 @@ public:
     zqArraySlot finish() {
         if (cls_ == zqStringClass) return host::makeStringArray(dims_, std::move(strings_));
         if (cls_ == zqCellClass) return host::makeCellArray(dims_, std::move(cells_));
-        if (complex_) setImaginaryPart(*array_, imaginary_);
+        if (complex_) host::makeComplex(*array_, imaginary_);
         return std::move(array_);
     }
 

@@ -208,7 +208,7 @@ zqArraySlot complexBody(const Builtin& self, std::span<Value> arguments) {
     zqArraySlot result = expandTo(real, dims);
     const zqArraySlot imaginaryExpanded = expandTo(*imaginary, dims);
     const std::size_t bytes = host::elementCount(*result) * host::elementSize(cls);
-    setImaginaryPart(*result, {static_cast<const std::byte*>(imaginaryExpanded->data), bytes});
+    host::makeComplex(*result, {static_cast<const std::byte*>(imaginaryExpanded->data), bytes});
     return result;
 }
 

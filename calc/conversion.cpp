@@ -62,7 +62,7 @@ zqArraySlot convertArray(const zqArray_tag& source, zqClassID cls) {
         zqArraySlot imaginaryPart = host::makeArray(from, dims, imaginaryBytes);
         result = convertReal(*realPart, cls);
         const zqArraySlot convertedImaginary = convertReal(*imaginaryPart, cls);
-        setImaginaryPart(*result, realBytes(*convertedImaginary));
+        host::makeComplex(*result, realBytes(*convertedImaginary));
     } else {
         result = convertReal(source, cls);
     }

@@ -118,7 +118,7 @@ void makeComplex(zqArray_tag& array, std::span<const std::byte> imaginaryBytes) 
     }
     StorageBlock* imaginary = allocateStorage(size);
     if (!imaginary) throw foundation::core::except::bad_alloc();
-    std::memcpy(imaginary->data(), imaginaryBytes.data(), size);
+    if (size != 0) std::memcpy(imaginary->data(), imaginaryBytes.data(), size);
     if (array.body->imaginary) releaseStorage(array.body->imaginary);
     array.body->imaginary = imaginary;
     array.flags |= zqComplexFlag;
