@@ -4,7 +4,6 @@
 // operands that can never be aligned together), broadcast, contiguous and
 // wider-strided inputs, and an output that is the first input.
 #include "engine/simd_loops.hpp"
-#include "engine/simd_functors.hpp"
 #include "engine_test_support.hpp"
 
 #include <string>
@@ -12,116 +11,11 @@
 namespace bitfcns::test {
 namespace {
 
-// Each pair: how to build its two functors from the run's parameter (shift
-// count or bit index), its reference, and the second operand it is used with.
-struct BitandPair {
-    template <class T>
-    static auto vector(std::uint32_t) {
-        return mu::IntBitandSSE2Ftor<T>{};
-    }
-    template <class T>
-    static auto scalar(std::uint32_t) {
-        return mu::IntBitandFtor<T>{};
-    }
-    template <class T>
-    static T expected(T a, T b, std::uint32_t p) {
-        return Reference::bitand_(a, b, p);
-    }
-    template <class T>
-    static std::vector<T> secondValues(std::size_t n) {
-        return testValues<T>(n, 2);
-    }
-};
-struct BitorPair {
-    template <class T>
-    static auto vector(std::uint32_t) {
-        return mu::IntBitorSSE2Ftor<T>{};
-    }
-    template <class T>
-    static auto scalar(std::uint32_t) {
-        return mu::IntBitorFtor<T>{};
-    }
-    template <class T>
-    static T expected(T a, T b, std::uint32_t p) {
-        return Reference::bitor_(a, b, p);
-    }
-    template <class T>
-    static std::vector<T> secondValues(std::size_t n) {
-        return testValues<T>(n, 2);
-    }
-};
-struct BitsetPair {
-    template <class T>
-    static auto vector(std::uint32_t p) {
-        return IntBitsetSSE2Ftor(p);
-    }
-    template <class T>
-    static auto scalar(std::uint32_t p) {
-        return IntBitsetFtor<T, T>(p);
-    }
-    template <class T>
-    static T expected(T a, T b, std::uint32_t p) {
-        return Reference::bitset(a, b, p);
-    }
-    template <class T>
-    static std::vector<T> secondValues(std::size_t n) {
-        return newBitValues<T>(n, 2);
-    }
-};
-// Used with a second operand of 1 only, the one use for which the twins agree.
-struct RightShiftAndPair {
-    template <class T>
-    static auto vector(std::uint32_t p) {
-        return IntRightShiftAndSSE2Ftor(p);
-    }
-    template <class T>
-    static auto scalar(std::uint32_t p) {
-        return IntRightShiftAndFtor<T>(p);
-    }
-    template <class T>
-    static T expected(T a, T b, std::uint32_t p) {
-        return Reference::rightShiftAnd(a, b, p);
-    }
-    template <class T>
-    static std::vector<T> secondValues(std::size_t n) {
-        return std::vector<T>(n, T(1));
-    }
-};
-struct LeftShiftPair {
-    template <class T>
-    static auto vector(std::uint32_t p) {
-        return IntLeftShiftSSE2Ftor(p);
-    }
-    template <class T>
-    static auto scalar(std::uint32_t p) {
-        return IntLeftShiftFtor<T>(p);
-    }
-    template <class T>
-    static T expected(T a, std::uint32_t p) {
-        return Reference::leftShift(a, p);
-    }
-};
-struct RightShiftPair {
-    template <class T>
-    static auto vector(std::uint32_t p) {
-        return IntRightShiftSSE2Ftor(p);
-    }
-    template <class T>
-    static auto scalar(std::uint32_t p) {
-        return IntRightShiftFtor<T>(p);
-    }
-    template <class T>
-    static T expected(T a, std::uint32_t p) {
-        return Reference::rightShift(a, p);
-    }
-};
-
 // Input strides: broadcast, contiguous, and one the library never passes.
 constexpr unsigned long inputStrides[] = {0, 1, 2};
 
 // Element offsets within a register to try for an input of this stride.
-template <class T>
-std::size_t offsetsFor(unsigned long stride) {
+template <class T> std::size_t offsetsFor(unsigned long stride) {
     return stride == 1 ? lanesOf<T> : 1;
 }
 
@@ -142,8 +36,7 @@ std::string layout(std::size_t n, std::size_t outOffset, std::size_t offset1, un
            std::to_string(stride2) + " parameter=" + std::to_string(parameter) + (inPlace ? " in place" : "");
 }
 
-template <class Pair, class T>
-void sweepBinary() {
+template <class Pair, class T> void sweepBinary() {
     constexpr std::size_t lanes = lanesOf<T>;
     constexpr std::size_t longest = 3 * lanes + 1;
     constexpr std::size_t room = 2 * longest + lanes;
@@ -179,8 +72,7 @@ void sweepBinary() {
                             }
 }
 
-template <class Pair, class T>
-void sweepUnary() {
+template <class Pair, class T> void sweepUnary() {
     constexpr std::size_t lanes = lanesOf<T>;
     constexpr std::size_t longest = 3 * lanes + 1;
     constexpr std::size_t room = 2 * longest + lanes;
@@ -209,8 +101,7 @@ void sweepUnary() {
                     }
 }
 
-template <class T>
-class EveryWidthPairs : public ::testing::Test {};
+template <class T> class EveryWidthPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryWidthPairs, AllIntegers);
 
 TYPED_TEST(EveryWidthPairs, Bitand) {
@@ -226,16 +117,14 @@ TYPED_TEST(EveryWidthPairs, LeftShift) {
     sweepUnary<LeftShiftPair, TypeParam>();
 }
 
-template <class T>
-class RightShiftPairs : public ::testing::Test {};
+template <class T> class RightShiftPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(RightShiftPairs, RightShiftIntegers);
 
 TYPED_TEST(RightShiftPairs, RightShift) {
     sweepUnary<RightShiftPair, TypeParam>();
 }
 
-template <class T>
-class BitsetPairs : public ::testing::Test {};
+template <class T> class BitsetPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(BitsetPairs, BitsetIntegers);
 
 TYPED_TEST(BitsetPairs, Bitset) {

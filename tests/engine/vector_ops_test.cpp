@@ -4,7 +4,6 @@
 // one thread), and the three plain records with broadcast inputs.
 #include "engine/vector_ops.hpp"
 #include "engine/parallel_limits.hpp"
-#include "engine/simd_functors.hpp"
 #include "engine_test_support.hpp"
 
 #include <tbb/global_control.h>
@@ -27,8 +26,7 @@ struct CallLog {
 };
 
 // A record that logs each subrange before handing it to the real one.
-template <class VectorOp>
-struct Logged {
+template <class VectorOp> struct Logged {
     VectorOp op;
     unsigned long n;
     CallLog* log;
@@ -54,110 +52,78 @@ bool coversExactlyOnce(std::vector<std::pair<unsigned long, unsigned long>> rang
     return next == n;
 }
 
-// Each SIMD family as its callers fill it: the data operand, a value operand
-// or broadcast constant, and the functors' parameter.
+// Where a family's callers put the data operand, and what goes beside it: a
+// broadcast constant (the plain or inverted mask, the 1 of bitget) or an
+// array of new bit values.
+enum class Layout { unary, dataThenConstant, constantThenData, dataThenValues };
+
 struct SetOneBit {
-    template <class T>
-    static constexpr unsigned long limit = limits::setOneBit<T>;
-    template <class T>
-    static auto record(T* out, const T* data, const T*, const T* constant, unsigned long n, std::uint32_t) {
-        return bitfcnsBinarySIMDVectorOp<T, mu::IntBitorSSE2Ftor<T>, mu::IntBitorFtor<T>>{
-            constant, data, out, 0, 1, n, {}, {}};
-    }
-    template <class T>
-    static T constant(std::uint32_t p) {
-        return T(std::uint64_t{1} << p);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return Reference::bitor_(a, constant<T>(p), p);
-    }
+    using Pair = BitorPair;
+    static constexpr Layout layout = Layout::constantThenData;
+    template <class T> static constexpr unsigned long limit = limits::setOneBit<T>;
+    template <class T> static T constant(std::uint32_t p) { return T(std::uint64_t{1} << p); }
 };
 struct ClearOneBit {
-    template <class T>
-    static constexpr unsigned long limit = limits::clearOneBit<T>;
-    template <class T>
-    static auto record(T* out, const T* data, const T*, const T* constant, unsigned long n, std::uint32_t) {
-        return bitfcnsBinarySIMDVectorOp<T, mu::IntBitandSSE2Ftor<T>, mu::IntBitandFtor<T>>{
-            constant, data, out, 0, 1, n, {}, {}};
-    }
-    template <class T>
-    static T constant(std::uint32_t p) {
-        return T(~(std::uint64_t{1} << p));
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return Reference::bitand_(a, constant<T>(p), p);
-    }
+    using Pair = BitandPair;
+    static constexpr Layout layout = Layout::constantThenData;
+    template <class T> static constexpr unsigned long limit = limits::clearOneBit<T>;
+    template <class T> static T constant(std::uint32_t p) { return T(~(std::uint64_t{1} << p)); }
 };
 struct GetOneBit {
-    template <class T>
-    static constexpr unsigned long limit = limits::getOneBit<T>;
-    template <class T>
-    static auto record(T* out, const T* data, const T*, const T* constant, unsigned long n, std::uint32_t p) {
-        return bitfcnsBinarySIMDVectorOp<T, IntRightShiftAndSSE2Ftor, IntRightShiftAndFtor<T>>{
-            data, constant, out, 1, 0, n, IntRightShiftAndSSE2Ftor(p), IntRightShiftAndFtor<T>(p)};
-    }
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(1);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return Reference::rightShiftAnd(a, T(1), p);
-    }
+    using Pair = RightShiftAndPair;
+    static constexpr Layout layout = Layout::dataThenConstant;
+    template <class T> static constexpr unsigned long limit = limits::getOneBit<T>;
+    template <class T> static T constant(std::uint32_t) { return T(1); }
 };
 struct SetBitFromValues {
-    template <class T>
-    static constexpr unsigned long limit = limits::setBitFromValues<T>;
-    template <class T>
-    static auto record(T* out, const T* data, const T* values, const T*, unsigned long n, std::uint32_t p) {
-        return bitfcnsBinarySIMDVectorOp<T, IntBitsetSSE2Ftor, IntBitsetFtor<T, T>>{
-            data, values, out, 1, 1, n, IntBitsetSSE2Ftor(p), IntBitsetFtor<T, T>(p)};
-    }
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(0);
-    }
-    template <class T>
-    static T expected(T a, T v, std::uint32_t p) {
-        return Reference::bitset(a, v, p);
-    }
+    using Pair = BitsetPair;
+    static constexpr Layout layout = Layout::dataThenValues;
+    template <class T> static constexpr unsigned long limit = limits::setBitFromValues<T>;
+    template <class T> static T constant(std::uint32_t) { return T(0); }
 };
 struct LeftShift {
-    template <class T>
-    static constexpr unsigned long limit = limits::leftShift<T>;
-    template <class T>
-    static auto record(T* out, const T* data, const T*, const T*, unsigned long n, std::uint32_t p) {
-        return bitfcnsUnarySIMDVectorOp<T, IntLeftShiftSSE2Ftor, IntLeftShiftFtor<T>>{
-            data, out, 1, n, IntLeftShiftSSE2Ftor(p), IntLeftShiftFtor<T>(p)};
-    }
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(0);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return Reference::leftShift(a, p);
-    }
+    using Pair = LeftShiftPair;
+    static constexpr Layout layout = Layout::unary;
+    template <class T> static constexpr unsigned long limit = limits::leftShift<T>;
+    template <class T> static T constant(std::uint32_t) { return T(0); }
 };
 struct RightShift {
-    template <class T>
-    static constexpr unsigned long limit = limits::rightShift<T>;
-    template <class T>
-    static auto record(T* out, const T* data, const T*, const T*, unsigned long n, std::uint32_t p) {
-        return bitfcnsUnarySIMDVectorOp<T, IntRightShiftSSE2Ftor, IntRightShiftFtor<T>>{
-            data, out, 1, n, IntRightShiftSSE2Ftor(p), IntRightShiftFtor<T>(p)};
-    }
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(0);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return Reference::rightShift(a, p);
-    }
+    using Pair = RightShiftPair;
+    static constexpr Layout layout = Layout::unary;
+    template <class T> static constexpr unsigned long limit = limits::rightShift<T>;
+    template <class T> static T constant(std::uint32_t) { return T(0); }
 };
+
+// The record of a family, filled as its callers fill it; `second` is the
+// constant or the new bit values.
+template <class Family, class T>
+auto familyRecord(T* out, const T* data, const T* second, unsigned long n, std::uint32_t p) {
+    const auto simd = Family::Pair::template vector<T>(p);
+    const auto scalar = Family::Pair::template scalar<T>(p);
+    if constexpr (Family::layout == Layout::unary) {
+        return bitfcnsUnarySIMDVectorOp<T, decltype(simd), decltype(scalar)>{data, out, 1, n, simd, scalar};
+    } else {
+        using Record = bitfcnsBinarySIMDVectorOp<T, decltype(simd), decltype(scalar)>;
+        if constexpr (Family::layout == Layout::constantThenData)
+            return Record{second, data, out, 0, 1, n, simd, scalar};
+        else if constexpr (Family::layout == Layout::dataThenConstant)
+            return Record{data, second, out, 1, 0, n, simd, scalar};
+        else
+            return Record{data, second, out, 1, 1, n, simd, scalar};
+    }
+}
+
+template <class Family, class T> T expectedElement(T a, T value, T constant, std::uint32_t p) {
+    using Pair = typename Family::Pair;
+    if constexpr (Family::layout == Layout::unary)
+        return Pair::expected(a, p);
+    else if constexpr (Family::layout == Layout::constantThenData)
+        return Pair::expected(constant, a, p);
+    else if constexpr (Family::layout == Layout::dataThenConstant)
+        return Pair::expected(a, constant, p);
+    else
+        return Pair::expected(a, value, p);
+}
 
 // Runs a family through runVectorOp over n elements, the data starting one
 // element past a register boundary, and checks every element and the calls.
@@ -170,13 +136,14 @@ void checkFamilyRun(const std::vector<T>& data, const std::vector<T>& values, un
     std::copy_n(data.begin(), n, dataAt);
     T* const out = inPlace ? dataAt : outBuffer.data() + 1;
     const T constant = Family::template constant<T>(parameter);
+    const T* second = Family::layout == Layout::dataThenValues ? values.data() : &constant;
 
     const unsigned long limit = Family::template limit<T>;
     CallLog log;
-    runVectorOp(Logged{Family::record(out, dataAt, values.data(), &constant, n, parameter), n, &log}, limit);
+    runVectorOp(Logged{familyRecord<Family>(out, dataAt, second, n, parameter), n, &log}, limit);
 
     unsigned long i = 0;
-    while (i < n && out[i] == Family::expected(data[i], values[i], parameter)) ++i;
+    while (i < n && out[i] == expectedElement<Family>(data[i], values[i], constant, parameter)) ++i;
     ASSERT_EQ(i, n) << "first wrong element of " << n;
     if (n < limit) {
         ASSERT_EQ(log.ranges.size(), 1u);
@@ -190,8 +157,7 @@ void checkFamilyRun(const std::vector<T>& data, const std::vector<T>& values, un
     }
 }
 
-template <class Family, class T>
-void checkFamilyAtLimit() {
+template <class Family, class T> void checkFamilyAtLimit() {
     const unsigned long limit = Family::template limit<T>;
     const std::vector<T> data = testValues<T>(limit, 5);
     const std::vector<T> values = newBitValues<T>(limit, 6);
@@ -206,8 +172,7 @@ void checkFamilyAtLimit() {
     }
 }
 
-template <class T>
-class EveryWidthFamilies : public ::testing::Test {};
+template <class T> class EveryWidthFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryWidthFamilies, AllIntegers);
 
 TYPED_TEST(EveryWidthFamilies, SetOneBit) {
@@ -223,16 +188,14 @@ TYPED_TEST(EveryWidthFamilies, LeftShift) {
     checkFamilyAtLimit<LeftShift, TypeParam>();
 }
 
-template <class T>
-class RightShiftFamilies : public ::testing::Test {};
+template <class T> class RightShiftFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(RightShiftFamilies, RightShiftIntegers);
 
 TYPED_TEST(RightShiftFamilies, RightShift) {
     checkFamilyAtLimit<RightShift, TypeParam>();
 }
 
-template <class T>
-class BitsetFamilies : public ::testing::Test {};
+template <class T> class BitsetFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(BitsetFamilies, BitsetIntegers);
 
 TYPED_TEST(BitsetFamilies, SetBitFromValues) {
