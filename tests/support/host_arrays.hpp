@@ -1,0 +1,83 @@
+// Terse makers and readers of host arrays for tests, and a caller of the
+// exported entry points that reports the identifier of a refusal.
+#pragma once
+
+#include "host/array_factory.hpp"
+#include "host/exceptions.hpp"
+#include "host/zq_array.hpp"
+
+#include <cstring>
+#include <exception>
+#include <initializer_list>
+#include <span>
+#include <string>
+#include <vector>
+
+namespace testing_support {
+
+// The host class of an element type.
+template <class T> inline constexpr zqClassID classIdOf = zqNoClass;
+template <> inline constexpr zqClassID classIdOf<signed char> = zqInt8Class;
+template <> inline constexpr zqClassID classIdOf<unsigned char> = zqUInt8Class;
+template <> inline constexpr zqClassID classIdOf<short> = zqInt16Class;
+template <> inline constexpr zqClassID classIdOf<unsigned short> = zqUInt16Class;
+template <> inline constexpr zqClassID classIdOf<int> = zqInt32Class;
+template <> inline constexpr zqClassID classIdOf<unsigned int> = zqUInt32Class;
+template <> inline constexpr zqClassID classIdOf<long> = zqInt64Class;
+template <> inline constexpr zqClassID classIdOf<unsigned long> = zqUInt64Class;
+template <> inline constexpr zqClassID classIdOf<float> = zqSingleClass;
+template <> inline constexpr zqClassID classIdOf<double> = zqDoubleClass;
+template <> inline constexpr zqClassID classIdOf<bool> = zqLogicalClass;
+
+// An array of T's class holding `values`; a row unless `dims` is given.
+template <class T>
+zqArraySlot makeOf(const std::vector<T>& values, host::Dims dims = {}) {
+    if (dims.empty()) dims = {1, values.size()};
+    if constexpr (std::is_same_v<T, bool>) {
+        std::vector<unsigned char> bytes(values.begin(), values.end());
+        return host::makeArray(classIdOf<T>, dims, std::span<const unsigned char>(bytes));
+    } else {
+        return host::makeArray(classIdOf<T>, dims, std::span<const T>(values));
+    }
+}
+
+template <class T>
+zqArraySlot makeOf(std::initializer_list<T> values, host::Dims dims = {}) {
+    return makeOf(std::vector<T>(values), std::move(dims));
+}
+
+template <class T>
+zqArraySlot scalarOf(T value) {
+    return makeOf<T>({value});
+}
+
+// The real elements of `array`, read as T.
+template <class T>
+std::vector<T> elementsOf(const zqArray_tag* array) {
+    std::vector<T> values(host::elementCount(*array));
+    if (!values.empty()) std::memcpy(values.data(), array->data, values.size() * sizeof(T));
+    return values;
+}
+
+using EntryPoint = void (*)(int, zqArraySlot*, int, const zqArray_tag**);
+
+// The outcome of one call: the result, or the refusal's identifier (the
+// what() text for an error without one).
+struct CallOutcome {
+    zqArraySlot result;
+    std::string error;
+};
+
+inline CallOutcome callEntry(EntryPoint entry, std::vector<const zqArray_tag*> inputs, int nlhs = 1) {
+    CallOutcome outcome;
+    try {
+        entry(nlhs, &outcome.result, static_cast<int>(inputs.size()), inputs.data());
+    } catch (const foundation::core::except::IMsgIDException& error) {
+        outcome.error = error.GetID();
+    } catch (const std::exception& error) {
+        outcome.error = error.what();
+    }
+    return outcome;
+}
+
+}  // namespace testing_support
