@@ -24,7 +24,8 @@ std::size_t elementSize(zqClassID cls);
 // Sizes are normalised the way the host shows them: fewer than two sizes are
 // padded with 1 to two, trailing sizes of 1 beyond the second are dropped.
 // Every maker raises the host's allocation failure when storage can't be
-// had; the contents of numeric arrays are zero unless given.
+// had, and std::invalid_argument when the class or the count of the data
+// given doesn't fit; the contents of numeric arrays are zero unless given.
 
 // A numeric, logical or char array. `bytes`, when given, holds the elements
 // in column-major order with the host's element type for the class.
@@ -71,7 +72,8 @@ void setIncompleteDimensions(zqArray_tag& array);
 // dimensions; with an empty `dims`, a record with no stored sizes at all.
 zqArraySlot makeArrayWithSizePointer(zqClassID cls, const Dims& dims);
 
-// Reading. `classOf` resolves opaque ids; `dimensions` completes sizes.
+// Reading. `classOf` resolves opaque ids; `dimensions` completes sizes and
+// shows them normalised (a record with no stored sizes as 1-by-1).
 zqClassID classOf(const zqArray_tag& array);
 Dims dimensions(const zqArray_tag& array);
 unsigned long elementCount(const zqArray_tag& array);

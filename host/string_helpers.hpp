@@ -24,7 +24,8 @@ struct StringArray {
 
 // With the flags false, true: true for a char array of two dimensions whose
 // first size is 1 or whose both sizes are 0, and for a 1-by-1 string array,
-// also one holding the missing value; false for everything else.
+// also one holding the missing value; false for everything else. With the
+// second flag false string arrays are refused; the first flag changes nothing.
 bool isScalarText(const zqArray_tag* array, bool, bool);
 
 // True for a string array of any size.

@@ -88,6 +88,10 @@ void error_maxrhs();
 void error_minrhs();
 
 // A new array with undefined contents, or null when storage can't be had.
+// Any class that holds elements (numeric, logical, char); zqComplex adds an
+// imaginary part to a numeric class. Sizes are normalised as the host shows
+// them: fewer than two padded with 1, trailing 1s beyond the second dropped.
+// Element storage is at least 16-byte aligned.
 zqArray_tag* create_uninitnumeric(unsigned long ndims, const unsigned long* dims, zqClassID cls,
                                   zqComplexity complexity, int, const zqArray_tag**);
 
@@ -108,7 +112,9 @@ bool* zqGetLogicals(const zqArray_tag* array);
 // otherwise a converted copy. Raises the host's allocation failure when
 // storage can't be had. Floating to integer rounds half away from zero and
 // saturates, NaN giving 0; integer to floating rounds to nearest; to logical,
-// anything non-zero (NaN included) is true.
+// anything non-zero (NaN included) is true. A complex array keeps its
+// imaginary part, converted too. Raises "VESPRA:bsxfun:badOperands" for a
+// class that holds no elements and for a complex array to logical or char.
 boost::intrusive_ptr<zqArray_tag> convert_if_needed(const zqArray_tag* array, zqClassID cls);
 
 }  // namespace matrix

@@ -1,0 +1,64 @@
+// The host's element types by class: one tag per class that holds elements,
+// the type lists of its families, and the one switch from a class id to a
+// tag, written as a visitor. Private to the host.
+#pragma once
+
+#include "host/zq_array.hpp"
+
+#include <cstddef>
+
+namespace host {
+
+template <class T, zqClassID Id>
+struct ElementTag {
+    using type = T;
+    static constexpr zqClassID id = Id;
+};
+
+using Int8Element = ElementTag<signed char, zqInt8Class>;
+using UInt8Element = ElementTag<unsigned char, zqUInt8Class>;
+using Int16Element = ElementTag<short, zqInt16Class>;
+using UInt16Element = ElementTag<unsigned short, zqUInt16Class>;
+using Int32Element = ElementTag<int, zqInt32Class>;
+using UInt32Element = ElementTag<unsigned int, zqUInt32Class>;
+using Int64Element = ElementTag<long, zqInt64Class>;
+using UInt64Element = ElementTag<unsigned long, zqUInt64Class>;
+using SingleElement = ElementTag<float, zqSingleClass>;
+using DoubleElement = ElementTag<double, zqDoubleClass>;
+using LogicalElement = ElementTag<bool, zqLogicalClass>;
+using CharElement = ElementTag<char16_t, zqCharClass>;
+
+template <class... Tags>
+struct TagList {};
+
+// The eight integer classes in class-id order.
+using IntegerElements = TagList<Int8Element, UInt8Element, Int16Element, UInt16Element,
+                                Int32Element, UInt32Element, Int64Element, UInt64Element>;
+// Every class that holds elements: what conversion reads and writes.
+using StoredElements =
+    TagList<Int8Element, UInt8Element, Int16Element, UInt16Element, Int32Element, UInt32Element,
+            Int64Element, UInt64Element, SingleElement, DoubleElement, LogicalElement, CharElement>;
+
+// Calls `visitor(Tag{})` for the tag of `List` whose id is `id`; returns false
+// when no tag of the list has that id.
+template <class... Tags, class Visitor>
+bool visitElementClass(TagList<Tags...>, zqClassID id, Visitor&& visitor) {
+    return ((id == Tags::id ? (visitor(Tags{}), true) : false) || ...);
+}
+
+// Element size in bytes for each stored class; 0 for any other class.
+template <class... Tags>
+constexpr std::size_t elementSizeIn(TagList<Tags...>, zqClassID id) {
+    std::size_t size = 0;
+    ((id == Tags::id ? (size = sizeof(typename Tags::type), true) : false) || ...);
+    return size;
+}
+
+constexpr bool isIntegerClass(zqClassID id) { return id >= zqInt8Class && id <= zqUInt64Class; }
+
+// The classes that carry the numeric flag: double, single and the integers.
+constexpr bool isNumericClass(zqClassID id) {
+    return id == zqDoubleClass || id == zqSingleClass || isIntegerClass(id);
+}
+
+}  // namespace host

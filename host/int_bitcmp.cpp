@@ -1,0 +1,77 @@
+// mu::IntVectorBitcmp: the integer complement loop of the math utility
+// library, instantiated here for the eight integer element types. Contiguous
+// runs are complemented byte-wise as XOR with all ones (SSE2), large ones in
+// parallel; strided ones element by element.
+#include "host/bitwise_kernels.hpp"
+#include "host/element_types.hpp"
+#include "host/math_utils.hpp"
+
+#include <tbb/blocked_range.h>
+#include <tbb/parallel_for.h>
+
+#include <cstddef>
+#include <tuple>
+
+namespace host {
+namespace {
+
+// From this many bytes the complement is split over TBB workers; one pass reads
+// and writes each byte once, so the same reasoning as for AND holds.
+constexpr std::size_t kParallelComplementBytes = std::size_t{256} << 10;
+constexpr std::size_t kComplementGrainBytes = std::size_t{64} << 10;
+
+void complementSerial(std::byte* out, const std::byte* in, std::size_t count) {
+    combineBytesWithPattern<BitxorBytes>(out, in, _mm_set1_epi32(-1), count);
+}
+
+// Complements `count` contiguous bytes; `out` may equal `in`.
+void complementBytes(std::byte* out, const std::byte* in, std::size_t count) {
+    if (count < kParallelComplementBytes) {
+        complementSerial(out, in, count);
+        return;
+    }
+    const std::size_t chunks = count / 16;
+    tbb::parallel_for(tbb::blocked_range<std::size_t>(0, chunks, kComplementGrainBytes / 16),
+                      [=](const tbb::blocked_range<std::size_t>& range) {
+                          const std::size_t begin = range.begin() * 16;
+                          // The last subrange also takes the bytes past the last full chunk.
+                          const std::size_t end = range.end() == chunks ? count : range.end() * 16;
+                          complementSerial(out + begin, in + begin, end - begin);
+                      });
+}
+
+}  // namespace
+}  // namespace host
+
+namespace mu {
+
+template <class T>
+void IntVectorBitcmp(T* out, T* in, unsigned long outStride, unsigned long inStride,
+                     unsigned long count) {
+    if (outStride != 1 || inStride != 1) {
+        for (unsigned long i = 0; i < count; ++i) {
+            out[i * outStride] = static_cast<T>(~in[i * inStride]);
+        }
+        return;
+    }
+    host::complementBytes(reinterpret_cast<std::byte*>(out), reinterpret_cast<const std::byte*>(in),
+                          count * sizeof(T));
+}
+
+}  // namespace mu
+
+namespace host {
+
+// Explicitly instantiating this class for the integer element types takes
+// the address of each IntVectorBitcmp instance, so that every one of them is
+// emitted and exported.
+template <class List>
+struct BitcmpInstances;
+template <class... Tags>
+struct BitcmpInstances<TagList<Tags...>> {
+    static auto table() { return std::tuple{&mu::IntVectorBitcmp<typename Tags::type>...}; }
+};
+
+template struct BitcmpInstances<IntegerElements>;
+
+}  // namespace host
