@@ -6,6 +6,7 @@
 #include <cstring>
 #include <map>
 #include <memory>
+#include <new>
 
 namespace bitfcns::bench {
 
@@ -62,32 +63,54 @@ benchmark::internal::Benchmark* registerCounts(const std::string& name, void (*f
     return bench;
 }
 
-template <> const char* className<signed char>() {
-    return "int8";
+template <> zqClassID classIdOf<signed char>() {
+    return zqInt8Class;
 }
-template <> const char* className<unsigned char>() {
-    return "uint8";
+template <> zqClassID classIdOf<unsigned char>() {
+    return zqUInt8Class;
 }
-template <> const char* className<short>() {
-    return "int16";
+template <> zqClassID classIdOf<short>() {
+    return zqInt16Class;
 }
-template <> const char* className<unsigned short>() {
-    return "uint16";
+template <> zqClassID classIdOf<unsigned short>() {
+    return zqUInt16Class;
 }
-template <> const char* className<int>() {
-    return "int32";
+template <> zqClassID classIdOf<int>() {
+    return zqInt32Class;
 }
-template <> const char* className<unsigned int>() {
-    return "uint32";
+template <> zqClassID classIdOf<unsigned int>() {
+    return zqUInt32Class;
 }
-template <> const char* className<long>() {
-    return "int64";
+template <> zqClassID classIdOf<long>() {
+    return zqInt64Class;
 }
-template <> const char* className<unsigned long>() {
-    return "uint64";
+template <> zqClassID classIdOf<unsigned long>() {
+    return zqUInt64Class;
 }
-template <> const char* className<double>() {
-    return "double";
+template <> zqClassID classIdOf<double>() {
+    return zqDoubleClass;
+}
+
+template <class T> const char* className() {
+    constexpr const char* names[] = {"double", "single", "int8",   "uint8", "int16",
+                                     "uint16", "int32",  "uint32", "int64", "uint64"};
+    return names[classIdOf<T>() - zqDoubleClass];
+}
+template const char* className<signed char>();
+template const char* className<unsigned char>();
+template const char* className<short>();
+template const char* className<unsigned short>();
+template const char* className<int>();
+template const char* className<unsigned int>();
+template const char* className<long>();
+template const char* className<unsigned long>();
+template const char* className<double>();
+
+zqArraySlot hostResult(zqClassID cls, unsigned long n) {
+    const unsigned long dims[] = {1, n};
+    zqArraySlot result(matrix::detail::create_uninitnumeric(2, dims, cls, zqReal, 0, nullptr));
+    if (!result) throw std::bad_alloc();
+    return result;
 }
 
 }  // namespace bitfcns::bench

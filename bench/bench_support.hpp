@@ -13,6 +13,8 @@
 // every parallel run.
 #pragma once
 
+#include "host/zq_array.hpp"
+
 #include <benchmark/benchmark.h>
 
 #include <cstddef>
@@ -39,7 +41,12 @@ std::vector<long> countsAroundLimit(unsigned long limit);
 benchmark::internal::Benchmark* registerCounts(const std::string& name, void (*fn)(benchmark::State&),
                                                const std::vector<long>& counts);
 
-// The class name of an element type: "uint8", "int64", "double".
+// The host class of an element type, and its name: "uint8", "double".
+template <class T> zqClassID classIdOf();
 template <class T> const char* className();
+
+// A new host array of n elements of class `cls` in one row, with undefined
+// contents, made the way a result is made.
+zqArraySlot hostResult(zqClassID cls, unsigned long n);
 
 }  // namespace bitfcns::bench
