@@ -51,6 +51,9 @@ using NumericClasses = Append<IntegerClasses, SingleTag, DoubleTag>::type;
 // The numeric classes and logical.
 using ValueClasses = Append<NumericClasses, LogicalTag>::type;
 
+// The integer classes are the run of ids from int8 to uint64.
+constexpr bool isIntegerClass(zqClassID id) { return id >= zqInt8Class && id <= zqUInt64Class; }
+
 // Width of an element type in bits.
 template <class T>
 inline constexpr int bitWidth = static_cast<int>(sizeof(T) * CHAR_BIT);

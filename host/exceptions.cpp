@@ -29,7 +29,10 @@ std::string narrow(std::u16string_view text) {
 }
 }  // namespace
 
+// The text is made on the first call and kept, so that every pointer handed
+// out stays valid for the life of the exception.
 const char* IException::what() const noexcept {
+    if (!whatText_.empty()) return whatText_.c_str();
     try {
         if (auto* identified = dynamic_cast<const IMsgIDException*>(this)) {
             whatText_ = narrow(identified->GetUnicodeMessageTxt());

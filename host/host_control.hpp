@@ -18,9 +18,10 @@ std::string lastLegacyErrorId();
 std::size_t legacyErrorCount();
 void resetLegacyErrors();
 
-// Makes the next `count` allocations of array storage or records fail:
-// creation returns null, and host operations that raise raise the
-// allocation failure.
-void failNextAllocations(std::size_t count = 1);
+// Lets the next `after` allocations of array storage or records succeed and
+// makes the `count` after them fail: creation returns null, and host
+// operations that raise raise the allocation failure. A count of 0 clears
+// any failure still pending.
+void failNextAllocations(std::size_t count = 1, std::size_t after = 0);
 
 }  // namespace host

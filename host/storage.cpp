@@ -34,6 +34,7 @@ constexpr bool kRecycleChunks = false;
 constexpr bool kRecycleChunks = true;
 #endif
 
+std::atomic<std::size_t> pendingSuccesses{0};
 std::atomic<std::size_t> pendingFailures{0};
 
 // ---------------------------------------------------------------------------
@@ -217,9 +218,16 @@ StorageBlock* acquireLargeBlock(std::size_t bytes) {
 
 }  // namespace
 
-void failNextAllocations(std::size_t count) { pendingFailures.store(count); }
+void failNextAllocations(std::size_t count, std::size_t after) {
+    pendingSuccesses.store(count == 0 ? 0 : after);
+    pendingFailures.store(count);
+}
 
 bool allocationPermitted() noexcept {
+    std::size_t successes = pendingSuccesses.load(std::memory_order_relaxed);
+    while (successes != 0) {
+        if (pendingSuccesses.compare_exchange_weak(successes, successes - 1)) return true;
+    }
     std::size_t pending = pendingFailures.load(std::memory_order_relaxed);
     while (pending != 0) {
         if (pendingFailures.compare_exchange_weak(pending, pending - 1)) return false;

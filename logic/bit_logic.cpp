@@ -1,1 +1,167 @@
-// bitand, bitor and bitxor: entry points and their common body.
+// bitand, bitor and bitxor: one body, parameterised by the host's element
+// routine and by the group of identifiers, behind three exported entry points.
+#include "bitfcns/entry_points.hpp"
+
+#include "frame/array.hpp"
+#include "frame/assumed_type.hpp"
+#include "frame/exception.hpp"
+#include "frame/floating.hpp"
+#include "frame/message_tags.hpp"
+#include "host/math_utils.hpp"
+
+#include <boost/intrusive_ptr.hpp>
+
+#include <algorithm>
+
+namespace bitfcns {
+namespace {
+
+using ElementRoutine = zqArraySlot (*)(const zqArray_tag*, const zqArray_tag*);
+
+// What the class-pair decision distinguishes. `other` is a class that passed
+// the numeric test without being one of the classes known here; it goes the
+// way of a logical.
+enum class Kind { integer, real64, real32, logical, other };
+
+Kind kindOf(const zqArray_tag* array) {
+    const zqClassID cls = classOf(array);
+    if (cls >= zqInt8Class && cls <= zqUInt64Class) return Kind::integer;
+    switch (cls) {
+        case zqDoubleClass: return Kind::real64;
+        case zqSingleClass: return Kind::real32;
+        case zqLogicalClass: return Kind::logical;
+        default: return Kind::other;
+    }
+}
+
+// In each dimension that both operands have, the sizes agree or one is 1.
+bool sizesExpand(const zqArray_tag* first, const zqArray_tag* second) {
+    const unsigned long common = std::min(numberOfDimensions(first), numberOfDimensions(second));
+    const unsigned long* firstSizes = dimensionsOf(first);
+    const unsigned long* secondSizes = dimensionsOf(second);
+    for (unsigned long i = 0; i < common; ++i) {
+        if (firstSizes[i] != 1 && secondSizes[i] != 1 && firstSizes[i] != secondSizes[i]) return false;
+    }
+    return true;
+}
+
+template <FixedString Group, ElementRoutine elementRoutine>
+class BitLogicCall {
+public:
+    BitLogicCall(int nrhs, const zqArray_tag** prhs)
+        : first_(prhs[0]), second_(prhs[1]), assumedType_(nrhs == 3 ? prhs[2] : nullptr) {}
+
+    // Runs the tests in their fixed order and computes the result; `plhs[0]`
+    // is written last, so a refused call leaves it as it was.
+    void run(zqArraySlot* plhs) {
+        if (isSparse(first_) || isSparse(second_)) fail<"sparseArgs">();
+        if (!isNumericOrLogical(first_) || !isNumericOrLogical(second_)) fail<"operandsNotNumeric">();
+        if (isComplex(first_) || isComplex(second_)) fail<"complexInputs">();
+        const Kind firstKind = kindOf(first_);
+        const Kind secondKind = kindOf(second_);
+        if ((firstKind == Kind::real32 && secondKind != Kind::integer) ||
+            (secondKind == Kind::real32 && firstKind != Kind::integer)) {
+            fail<"firstArgsNotInt">();
+        }
+        const bool firstIsScalar = isScalar(first_);
+        const bool secondIsScalar = isScalar(second_);
+        if (!sizesExpand(first_, second_)) fail<"sizeMismatch">();
+
+        if (firstKind == Kind::integer || secondKind == Kind::integer) {
+            const bool allowed = firstKind == Kind::integer
+                                     ? integerPartnerAllowed(secondKind, secondIsScalar)
+                                     : integerPartnerAllowed(firstKind, firstIsScalar);
+            if (!allowed) fail<"mixedClasses">();
+            *plhs = onIntegers(firstKind == Kind::integer ? classOf(first_) : classOf(second_));
+        } else {
+            *plhs = onDoublesAndLogicals(firstKind, secondKind);
+        }
+    }
+
+private:
+    template <FixedString Leaf>
+    [[noreturn]] static void fail() {
+        raiseError<MessageTag<Group, Leaf>>();
+    }
+
+    static bool isNumericOrLogical(const zqArray_tag* array) {
+        return isNumeric(array) || isLogical(array);
+    }
+
+    // The partner of an integer operand may be of the same integer class, or
+    // a double scalar; any other class, and a double of any other shape, an
+    // empty one among them, is refused.
+    bool integerPartnerAllowed(Kind partnerKind, bool partnerIsScalar) const {
+        if (partnerKind == Kind::integer) return classOf(first_) == classOf(second_);
+        return partnerKind == Kind::real64 && partnerIsScalar;
+    }
+
+    // The integer class decides. An assumed type may only confirm it; a
+    // double scalar partner must hold an integer of that class. The operands
+    // go to the element routine as they came.
+    zqArraySlot onIntegers(zqClassID integerClass) const {
+        if (assumedType_ != nullptr) {
+            const zqClassID assumed = parseAssumedType(assumedType_);
+            if (assumed == zqNoClass) fail<"unknownTypeString">();
+            if (assumed != integerClass) fail<"invalidTypeString">();
+        }
+        for (const zqArray_tag* operand : {first_, second_}) {
+            if (kindOf(operand) == Kind::real64 && !fitsIntegerClass(operand, integerClass)) {
+                fail<"outOfRangeMixedType">();
+            }
+        }
+        return elementRoutine(first_, second_);
+    }
+
+    // Doubles and logicals are taken for integers of the working class, uint64
+    // or the assumed type, and the answer comes back as double. Two logicals
+    // with no assumed type go to the element routine as they are.
+    zqArraySlot onDoublesAndLogicals(Kind firstKind, Kind secondKind) const {
+        zqClassID workClass = zqUInt64Class;
+        if (assumedType_ == nullptr) {
+            if (firstKind == Kind::logical && secondKind == Kind::logical) {
+                return elementRoutine(first_, second_);
+            }
+        } else {
+            workClass = parseAssumedType(assumedType_);
+            if (workClass == zqNoClass) fail<"unknownTypeString">();
+        }
+        const auto convertedFirst = validatedConversion(first_, firstKind, workClass);
+        const auto convertedSecond = validatedConversion(second_, secondKind, workClass);
+        const zqArraySlot result = elementRoutine(convertedFirst.get(), convertedSecond.get());
+        return zqArraySlot(matrix::convert_if_needed(result.get(), zqDoubleClass).detach());
+    }
+
+    static boost::intrusive_ptr<zqArray_tag> validatedConversion(const zqArray_tag* operand, Kind kind,
+                                                                  zqClassID workClass) {
+        if (kind == Kind::real64 && !fitsIntegerClass(operand, workClass)) fail<"outOfRange">();
+        return matrix::convert_if_needed(operand, workClass);
+    }
+
+    const zqArray_tag* first_;
+    const zqArray_tag* second_;
+    const zqArray_tag* assumedType_;
+};
+
+template <FixedString Group, ElementRoutine elementRoutine>
+void bitLogicFunction(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    if (nlhs > 1) matrix::detail::error_maxlhs();
+    if (nrhs > 3) matrix::detail::error_maxrhs();
+    if (nrhs < 2) matrix::detail::error_minrhs();
+    BitLogicCall<Group, elementRoutine>(nrhs, prhs).run(plhs);
+}
+
+}  // namespace
+}  // namespace bitfcns
+
+void ondelBitAndFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    bitfcns::bitLogicFunction<VESPRA::Bitand::group, bitandBsxfunHelper>(nlhs, plhs, nrhs, prhs);
+}
+
+void ondelBitOrFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    bitfcns::bitLogicFunction<VESPRA::Bitor::group, bitorBsxfunHelper>(nlhs, plhs, nrhs, prhs);
+}
+
+void ondelBitXorFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    bitfcns::bitLogicFunction<VESPRA::bitxor::group, bitxorBsxfunHelper>(nlhs, plhs, nrhs, prhs);
+}
