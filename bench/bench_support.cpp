@@ -12,7 +12,8 @@ namespace bitfcns::bench {
 
 double memcpyBytesPerSecond(std::size_t bytesProcessed) {
     static std::map<std::size_t, double> measured;
-    if (const auto known = measured.find(bytesProcessed); known != measured.end()) return known->second;
+    if (const auto known = measured.find(bytesProcessed); known != measured.end())
+        return known->second;
 
     const std::size_t copied = bytesProcessed / 2 == 0 ? 1 : bytesProcessed / 2;
     const auto source = std::make_unique<unsigned char[]>(copied);  // zeroed: mapped and touched
@@ -42,12 +43,13 @@ double memcpyBytesPerSecond(std::size_t bytesProcessed) {
 }
 
 void reportBytes(benchmark::State& state, std::size_t bytesPerIteration) {
-    const double bytes = static_cast<double>(bytesPerIteration) * static_cast<double>(state.iterations());
+    const double bytes =
+        static_cast<double>(bytesPerIteration) * static_cast<double>(state.iterations());
     state.SetBytesProcessed(static_cast<std::int64_t>(bytes));
     // A rate counter, which the framework divides by the case's real time:
     // bytes per second over memcpy's bytes per second.
-    state.counters["vs_memcpy"] =
-        benchmark::Counter(bytes / memcpyBytesPerSecond(bytesPerIteration), benchmark::Counter::kIsRate);
+    state.counters["vs_memcpy"] = benchmark::Counter(
+        bytes / memcpyBytesPerSecond(bytesPerIteration), benchmark::Counter::kIsRate);
 }
 
 std::vector<long> countsAroundLimit(unsigned long limit) {
@@ -55,7 +57,8 @@ std::vector<long> countsAroundLimit(unsigned long limit) {
     return {1000, 100000, atLimit - 1, atLimit, 5000000, 50000000};
 }
 
-benchmark::internal::Benchmark* registerCounts(const std::string& name, void (*fn)(benchmark::State&),
+benchmark::internal::Benchmark* registerCounts(const std::string& name,
+                                               void (*fn)(benchmark::State&),
                                                const std::vector<long>& counts) {
     auto* bench = benchmark::RegisterBenchmark(name.c_str(), fn);
     bench->ArgName("n")->UseRealTime();

@@ -38,7 +38,8 @@ std::vector<long> countsAroundLimit(unsigned long limit);
 
 // Registers `fn` as a real-time case for each count, named
 // "<name>/n:<count>".
-benchmark::internal::Benchmark* registerCounts(const std::string& name, void (*fn)(benchmark::State&),
+benchmark::internal::Benchmark* registerCounts(const std::string& name,
+                                               void (*fn)(benchmark::State&),
                                                const std::vector<long>& counts);
 
 // The host class of an element type, and its name: "uint8", "double".

@@ -26,7 +26,8 @@ struct SetOneBit {
     static constexpr std::size_t elementsMoved = 2;
     template <class T> static constexpr unsigned long limit = limits::setOneBit<T>;
     template <class T>
-    static auto record(T* out, const T* data, const T*, const T* mask, unsigned long n, std::uint32_t) {
+    static auto record(T* out, const T* data, const T*, const T* mask, unsigned long n,
+                       std::uint32_t) {
         return bitfcnsBinarySIMDVectorOp<T, mu::IntBitorSSE2Ftor<T>, mu::IntBitorFtor<T>>{
             mask, data, out, 0, 1, n, {}, {}};
     }
@@ -36,7 +37,8 @@ struct ClearOneBit {
     static constexpr std::size_t elementsMoved = 2;
     template <class T> static constexpr unsigned long limit = limits::clearOneBit<T>;
     template <class T>
-    static auto record(T* out, const T* data, const T*, const T* mask, unsigned long n, std::uint32_t) {
+    static auto record(T* out, const T* data, const T*, const T* mask, unsigned long n,
+                       std::uint32_t) {
         return bitfcnsBinarySIMDVectorOp<T, mu::IntBitandSSE2Ftor<T>, mu::IntBitandFtor<T>>{
             mask, data, out, 0, 1, n, {}, {}};
     }
@@ -46,7 +48,8 @@ struct GetOneBit {
     static constexpr std::size_t elementsMoved = 2;
     template <class T> static constexpr unsigned long limit = limits::getOneBit<T>;
     template <class T>
-    static auto record(T* out, const T* data, const T*, const T* one, unsigned long n, std::uint32_t p) {
+    static auto record(T* out, const T* data, const T*, const T* one, unsigned long n,
+                       std::uint32_t p) {
         return bitfcnsBinarySIMDVectorOp<T, IntRightShiftAndSSE2Ftor, IntRightShiftAndFtor<T>>{
             data, one, out, 1, 0, n, IntRightShiftAndSSE2Ftor(p), IntRightShiftAndFtor<T>(p)};
     }
@@ -56,7 +59,8 @@ struct SetBitFromValues {
     static constexpr std::size_t elementsMoved = 3;
     template <class T> static constexpr unsigned long limit = limits::setBitFromValues<T>;
     template <class T>
-    static auto record(T* out, const T* data, const T* values, const T*, unsigned long n, std::uint32_t p) {
+    static auto record(T* out, const T* data, const T* values, const T*, unsigned long n,
+                       std::uint32_t p) {
         return bitfcnsBinarySIMDVectorOp<T, IntBitsetSSE2Ftor, IntBitsetFtor<T, T>>{
             data, values, out, 1, 1, n, IntBitsetSSE2Ftor(p), IntBitsetFtor<T, T>(p)};
     }
@@ -66,7 +70,8 @@ struct LeftShift {
     static constexpr std::size_t elementsMoved = 2;
     template <class T> static constexpr unsigned long limit = limits::leftShift<T>;
     template <class T>
-    static auto record(T* out, const T* data, const T*, const T*, unsigned long n, std::uint32_t p) {
+    static auto record(T* out, const T* data, const T*, const T*, unsigned long n,
+                       std::uint32_t p) {
         return bitfcnsUnarySIMDVectorOp<T, IntLeftShiftSSE2Ftor, IntLeftShiftFtor<T>>{
             data, out, 1, n, IntLeftShiftSSE2Ftor(p), IntLeftShiftFtor<T>(p)};
     }
@@ -76,7 +81,8 @@ struct RightShift {
     static constexpr std::size_t elementsMoved = 2;
     template <class T> static constexpr unsigned long limit = limits::rightShift<T>;
     template <class T>
-    static auto record(T* out, const T* data, const T*, const T*, unsigned long n, std::uint32_t p) {
+    static auto record(T* out, const T* data, const T*, const T*, unsigned long n,
+                       std::uint32_t p) {
         return bitfcnsUnarySIMDVectorOp<T, IntRightShiftSSE2Ftor, IntRightShiftFtor<T>>{
             data, out, 1, n, IntRightShiftSSE2Ftor(p), IntRightShiftFtor<T>(p)};
     }

@@ -51,7 +51,8 @@ inline constexpr unsigned long setBitFromValues = detail::byWidth<T>(3500000, 15
 // The step down from 16 to 8 bits in the two shifts is wanted.
 template <class T>  // IntLeftShiftSSE2Ftor: one shift count to the left
 inline constexpr unsigned long leftShift = detail::byWidth<T>(400000, 3500000, 2000000, 1000000);
-template <class T>  // IntRightShiftSSE2Ftor: one shift count to the right (unsigned only at 64 bits)
+template <
+    class T>  // IntRightShiftSSE2Ftor: one shift count to the right (unsigned only at 64 bits)
 inline constexpr unsigned long rightShift = detail::byWidth<T>(400000, 3500000, 2000000, 1000000);
 
 }  // namespace bitfcns::limits

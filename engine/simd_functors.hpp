@@ -215,7 +215,9 @@ template <class T> class IntRightShiftFtor {
 public:
     explicit IntRightShiftFtor(std::uint32_t count) noexcept : count_(count) {}
 
-    T operator()(T x) const noexcept { return static_cast<T>(static_cast<Widened<T>>(x) >> count_); }
+    T operator()(T x) const noexcept {
+        return static_cast<T>(static_cast<Widened<T>>(x) >> count_);
+    }
 
 private:
     std::uint32_t count_;
@@ -244,7 +246,8 @@ public:
     explicit IntRightShiftAndFtor(std::uint32_t count) noexcept : count_(count) {}
 
     T operator()(T in1, T in2) const noexcept {
-        return static_cast<T>((static_cast<Widened<T>>(in1) >> count_) & static_cast<Widened<T>>(in2));
+        return static_cast<T>((static_cast<Widened<T>>(in1) >> count_) &
+                              static_cast<Widened<T>>(in2));
     }
 
 private:

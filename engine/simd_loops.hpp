@@ -41,17 +41,20 @@ unsigned long headLength(unsigned long n, std::initializer_list<const T*> pointe
 // left past the run. Kept out of the auto-vectorizer: it would turn these
 // loops into unaligned vector loads and stores, which the engine never makes.
 template <class T, class ScalarFtor>
-[[gnu::optimize("no-tree-vectorize")]] void scalarRun(T*& out, const T*& in, unsigned long outStride,
-                                                      unsigned long stride, unsigned long n,
+[[gnu::optimize("no-tree-vectorize")]] void scalarRun(T*& out, const T*& in,
+                                                      unsigned long outStride, unsigned long stride,
+                                                      unsigned long n,
                                                       ScalarFtor scalarFtor) noexcept {
     for (; n != 0; --n, out += outStride, in += stride) *out = scalarFtor(*in);
 }
 template <class T, class ScalarFtor>
 [[gnu::optimize("no-tree-vectorize")]] void scalarRun(T*& out, const T*& in1, const T*& in2,
-                                                      unsigned long outStride, unsigned long stride1,
-                                                      unsigned long stride2, unsigned long n,
+                                                      unsigned long outStride,
+                                                      unsigned long stride1, unsigned long stride2,
+                                                      unsigned long n,
                                                       ScalarFtor scalarFtor) noexcept {
-    for (; n != 0; --n, out += outStride, in1 += stride1, in2 += stride2) *out = scalarFtor(*in1, *in2);
+    for (; n != 0; --n, out += outStride, in1 += stride1, in2 += stride2)
+        *out = scalarFtor(*in1, *in2);
 }
 
 // An input read straight from memory, one aligned register per step.
@@ -99,8 +102,8 @@ void alignedBody(T* out, unsigned long blocks, VectorOp op, Inputs... inputs) no
 // strides isn't built (the library never passes them): the twin does those
 // runs alone.
 template <class T, class SimdFtor, class ScalarFtor>
-void unarySIMDApply(T* out, const T* in, unsigned long outStride, unsigned long stride, unsigned long n,
-                    SimdFtor simdFtor, ScalarFtor scalarFtor) noexcept {
+void unarySIMDApply(T* out, const T* in, unsigned long outStride, unsigned long stride,
+                    unsigned long n, SimdFtor simdFtor, ScalarFtor scalarFtor) noexcept {
     constexpr unsigned long lanes = lanesOf<T>;
     if (n == 0) return;
     if (n < lanes || stride != 1 || outStride != 1) {
@@ -115,7 +118,8 @@ void unarySIMDApply(T* out, const T* in, unsigned long outStride, unsigned long 
 
     // Body.
     const unsigned long blocks = n / lanes;
-    simd_detail::alignedBody(out, blocks, simdFtor.template prepare<T>(), simd_detail::StreamedInput<T>(in));
+    simd_detail::alignedBody(out, blocks, simdFtor.template prepare<T>(),
+                             simd_detail::StreamedInput<T>(in));
     out += blocks * lanes;
     in += blocks * lanes;
 
@@ -130,9 +134,9 @@ void unarySIMDApply(T* out, const T* in, unsigned long outStride, unsigned long 
 // loop). The loops for other strides aren't built (the library never passes
 // them): the twin does those runs alone.
 template <class T, class SimdFtor, class ScalarFtor>
-void binarySIMDApply(T* out, const T* in1, const T* in2, unsigned long outStride, unsigned long stride1,
-                     unsigned long stride2, unsigned long n, SimdFtor simdFtor,
-                     ScalarFtor scalarFtor) noexcept {
+void binarySIMDApply(T* out, const T* in1, const T* in2, unsigned long outStride,
+                     unsigned long stride1, unsigned long stride2, unsigned long n,
+                     SimdFtor simdFtor, ScalarFtor scalarFtor) noexcept {
     using simd_detail::BroadcastInput;
     using simd_detail::StreamedInput;
     constexpr unsigned long lanes = lanesOf<T>;
@@ -147,8 +151,9 @@ void binarySIMDApply(T* out, const T* in1, const T* in2, unsigned long outStride
 
     // Head: the twin until `out` and the contiguous inputs are aligned at the
     // same element; a broadcast input steps by 0 meanwhile.
-    const unsigned long head = unitLoop ? simd_detail::headLength<T>(n, {out, in1, in2})
-                                        : simd_detail::headLength<T>(n, {out, firstUnitLoop ? in1 : in2});
+    const unsigned long head =
+        unitLoop ? simd_detail::headLength<T>(n, {out, in1, in2})
+                 : simd_detail::headLength<T>(n, {out, firstUnitLoop ? in1 : in2});
     simd_detail::scalarRun(out, in1, in2, 1, stride1, stride2, head, scalarFtor);
     n -= head;
 

@@ -77,8 +77,8 @@ template <class T, class SimdFtor, class ScalarFtor> struct bitfcnsUnarySIMDVect
     ScalarFtor scalarFtor;
 
     void operator()(const VectorRange& range) const noexcept {
-        unarySIMDApply(out + range.begin(), in + range.begin() * stride, 1, stride, range.size(), simdFtor,
-                       scalarFtor);
+        unarySIMDApply(out + range.begin(), in + range.begin() * stride, 1, stride, range.size(),
+                       simdFtor, scalarFtor);
     }
 };
 
@@ -95,8 +95,9 @@ template <class T, class SimdFtor, class ScalarFtor> struct bitfcnsBinarySIMDVec
     ScalarFtor scalarFtor;
 
     void operator()(const VectorRange& range) const noexcept {
-        binarySIMDApply(out + range.begin(), in1 + range.begin() * stride1, in2 + range.begin() * stride2, 1,
-                        stride1, stride2, range.size(), simdFtor, scalarFtor);
+        binarySIMDApply(out + range.begin(), in1 + range.begin() * stride1,
+                        in2 + range.begin() * stride2, 1, stride1, stride2, range.size(), simdFtor,
+                        scalarFtor);
     }
 };
 

@@ -19,13 +19,14 @@
 
 namespace bitfcns::test {
 
-using AllIntegers = ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int,
-                                     long, unsigned long>;
+using AllIntegers = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                     unsigned int, long, unsigned long>;
 // The right shift has no vector form for signed 64-bit elements.
-using RightShiftIntegers =
-    ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int, unsigned long>;
+using RightShiftIntegers = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                            unsigned int, unsigned long>;
 // The vector bitset exists for 8, 16 and 32-bit elements.
-using BitsetIntegers = ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int>;
+using BitsetIntegers =
+    ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int>;
 
 template <class T> inline constexpr std::uint32_t bitsOf = sizeof(T) * 8;
 
@@ -36,7 +37,8 @@ public:
     static constexpr unsigned char sentinel = 0xA5;
 
     explicit AlignedBuffer(std::size_t size)
-        : size_(size), data_(static_cast<T*>(::operator new[](size * sizeof(T) + 16, std::align_val_t{16}))) {
+        : size_(size),
+          data_(static_cast<T*>(::operator new[](size * sizeof(T) + 16, std::align_val_t{16}))) {
         reset();
     }
     ~AlignedBuffer() { ::operator delete[](data_, std::align_val_t{16}); }
@@ -67,9 +69,13 @@ private:
 
 // `count` values of T: the extremes, 0, 1 and -1 first, then random ones.
 template <class T> std::vector<T> testValues(std::size_t count, std::uint32_t seed) {
-    std::vector<T> values{
-        std::numeric_limits<T>::min(),        std::numeric_limits<T>::max(),       T(0), T(1), T(-1),
-        T(std::numeric_limits<T>::min() + 1), T(std::numeric_limits<T>::max() - 1)};
+    std::vector<T> values{std::numeric_limits<T>::min(),
+                          std::numeric_limits<T>::max(),
+                          T(0),
+                          T(1),
+                          T(-1),
+                          T(std::numeric_limits<T>::min() + 1),
+                          T(std::numeric_limits<T>::max() - 1)};
     std::mt19937_64 random(seed);
     while (values.size() < count) values.push_back(static_cast<T>(random()));
     values.resize(count);
@@ -95,14 +101,22 @@ template <class T> std::uint64_t bitPattern(T x) {
 struct BitandPair {
     template <class T> static auto vector(std::uint32_t) { return mu::IntBitandSSE2Ftor<T>{}; }
     template <class T> static auto scalar(std::uint32_t) { return mu::IntBitandFtor<T>{}; }
-    template <class T> static T expected(T a, T b, std::uint32_t) { return T(bitPattern(a) & bitPattern(b)); }
-    template <class T> static std::vector<T> secondValues(std::size_t n) { return testValues<T>(n, 2); }
+    template <class T> static T expected(T a, T b, std::uint32_t) {
+        return T(bitPattern(a) & bitPattern(b));
+    }
+    template <class T> static std::vector<T> secondValues(std::size_t n) {
+        return testValues<T>(n, 2);
+    }
 };
 struct BitorPair {
     template <class T> static auto vector(std::uint32_t) { return mu::IntBitorSSE2Ftor<T>{}; }
     template <class T> static auto scalar(std::uint32_t) { return mu::IntBitorFtor<T>{}; }
-    template <class T> static T expected(T a, T b, std::uint32_t) { return T(bitPattern(a) | bitPattern(b)); }
-    template <class T> static std::vector<T> secondValues(std::size_t n) { return testValues<T>(n, 2); }
+    template <class T> static T expected(T a, T b, std::uint32_t) {
+        return T(bitPattern(a) | bitPattern(b));
+    }
+    template <class T> static std::vector<T> secondValues(std::size_t n) {
+        return testValues<T>(n, 2);
+    }
 };
 struct BitsetPair {
     template <class T> static auto vector(std::uint32_t p) { return IntBitsetSSE2Ftor(p); }
@@ -111,7 +125,9 @@ struct BitsetPair {
         const std::uint64_t mask = std::uint64_t{1} << index;
         return T(v != 0 ? bitPattern(a) | mask : bitPattern(a) & ~mask);
     }
-    template <class T> static std::vector<T> secondValues(std::size_t n) { return newBitValues<T>(n, 2); }
+    template <class T> static std::vector<T> secondValues(std::size_t n) {
+        return newBitValues<T>(n, 2);
+    }
 };
 // Used with a second operand of 1 only, the one use for which the twins agree.
 struct RightShiftAndPair {
@@ -120,12 +136,16 @@ struct RightShiftAndPair {
     template <class T> static T expected(T a, T b, std::uint32_t count) {
         return T((bitPattern(a) >> count) & bitPattern(b));
     }
-    template <class T> static std::vector<T> secondValues(std::size_t n) { return std::vector<T>(n, T(1)); }
+    template <class T> static std::vector<T> secondValues(std::size_t n) {
+        return std::vector<T>(n, T(1));
+    }
 };
 struct LeftShiftPair {
     template <class T> static auto vector(std::uint32_t p) { return IntLeftShiftSSE2Ftor(p); }
     template <class T> static auto scalar(std::uint32_t p) { return IntLeftShiftFtor<T>(p); }
-    template <class T> static T expected(T a, std::uint32_t count) { return T(bitPattern(a) << count); }
+    template <class T> static T expected(T a, std::uint32_t count) {
+        return T(bitPattern(a) << count);
+    }
 };
 struct RightShiftPair {
     template <class T> static auto vector(std::uint32_t p) { return IntRightShiftSSE2Ftor(p); }

@@ -30,10 +30,12 @@ const T* place(AlignedBuffer<T>& buffer, const std::vector<T>& values, std::size
 }
 
 std::string layout(std::size_t n, std::size_t outOffset, std::size_t offset1, unsigned long stride1,
-                   std::size_t offset2, unsigned long stride2, std::uint32_t parameter, bool inPlace) {
+                   std::size_t offset2, unsigned long stride2, std::uint32_t parameter,
+                   bool inPlace) {
     return "n=" + std::to_string(n) + " out@" + std::to_string(outOffset) + " in1@" +
-           std::to_string(offset1) + "/" + std::to_string(stride1) + " in2@" + std::to_string(offset2) + "/" +
-           std::to_string(stride2) + " parameter=" + std::to_string(parameter) + (inPlace ? " in place" : "");
+           std::to_string(offset1) + "/" + std::to_string(stride1) + " in2@" +
+           std::to_string(offset2) + "/" + std::to_string(stride2) +
+           " parameter=" + std::to_string(parameter) + (inPlace ? " in place" : "");
 }
 
 template <class Pair, class T> void sweepBinary() {
@@ -56,19 +58,21 @@ template <class Pair, class T> void sweepBinary() {
                                 out.reset();
                                 const T* a = place(inPlace ? out : in1, first, offset1, stride1, n);
                                 const T* b = place(in2, second, offset2, stride2, n);
-                                binarySIMDApply(out.data() + outOffset, a, b, 1, stride1, stride2, n,
-                                                Pair::template vector<T>(parameter),
+                                binarySIMDApply(out.data() + outOffset, a, b, 1, stride1, stride2,
+                                                n, Pair::template vector<T>(parameter),
                                                 Pair::template scalar<T>(parameter));
                                 const T* result = out.data() + outOffset;
                                 for (std::size_t i = 0; i < n; ++i)
-                                    ASSERT_EQ(result[i],
-                                              Pair::expected(first[stride1 == 0 ? 0 : i],
-                                                             second[stride2 == 0 ? 0 : i], parameter))
+                                    ASSERT_EQ(
+                                        result[i],
+                                        Pair::expected(first[stride1 == 0 ? 0 : i],
+                                                       second[stride2 == 0 ? 0 : i], parameter))
                                         << "element " << i << ", "
-                                        << layout(n, outOffset, offset1, stride1, offset2, stride2, parameter,
-                                                  inPlace);
-                                ASSERT_TRUE(out.untouchedOutside(outOffset, n)) << layout(
-                                    n, outOffset, offset1, stride1, offset2, stride2, parameter, inPlace);
+                                        << layout(n, outOffset, offset1, stride1, offset2, stride2,
+                                                  parameter, inPlace);
+                                ASSERT_TRUE(out.untouchedOutside(outOffset, n))
+                                    << layout(n, outOffset, offset1, stride1, offset2, stride2,
+                                              parameter, inPlace);
                             }
 }
 
@@ -93,7 +97,8 @@ template <class Pair, class T> void sweepUnary() {
                                        Pair::template scalar<T>(parameter));
                         const T* result = out.data() + outOffset;
                         for (std::size_t i = 0; i < n; ++i)
-                            ASSERT_EQ(result[i], Pair::expected(values[stride == 0 ? 0 : i], parameter))
+                            ASSERT_EQ(result[i],
+                                      Pair::expected(values[stride == 0 ? 0 : i], parameter))
                                 << "element " << i << ", "
                                 << layout(n, outOffset, offset, stride, 0, 0, parameter, inPlace);
                         ASSERT_TRUE(out.untouchedOutside(outOffset, n))

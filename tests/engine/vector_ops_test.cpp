@@ -42,7 +42,8 @@ template <class VectorOp> struct Logged {
 };
 
 // True when the logged ranges cover [0, n) exactly once.
-bool coversExactlyOnce(std::vector<std::pair<unsigned long, unsigned long>> ranges, unsigned long n) {
+bool coversExactlyOnce(std::vector<std::pair<unsigned long, unsigned long>> ranges,
+                       unsigned long n) {
     std::sort(ranges.begin(), ranges.end());
     unsigned long next = 0;
     for (const auto& [begin, end] : ranges) {
@@ -101,7 +102,8 @@ auto familyRecord(T* out, const T* data, const T* second, unsigned long n, std::
     const auto simd = Family::Pair::template vector<T>(p);
     const auto scalar = Family::Pair::template scalar<T>(p);
     if constexpr (Family::layout == Layout::unary) {
-        return bitfcnsUnarySIMDVectorOp<T, decltype(simd), decltype(scalar)>{data, out, 1, n, simd, scalar};
+        return bitfcnsUnarySIMDVectorOp<T, decltype(simd), decltype(scalar)>{data, out,  1,
+                                                                             n,    simd, scalar};
     } else {
         using Record = bitfcnsBinarySIMDVectorOp<T, decltype(simd), decltype(scalar)>;
         if constexpr (Family::layout == Layout::constantThenData)
@@ -128,8 +130,8 @@ template <class Family, class T> T expectedElement(T a, T value, T constant, std
 // Runs a family through runVectorOp over n elements, the data starting one
 // element past a register boundary, and checks every element and the calls.
 template <class Family, class T>
-void checkFamilyRun(const std::vector<T>& data, const std::vector<T>& values, unsigned long n, bool inPlace,
-                    bool expectSplit) {
+void checkFamilyRun(const std::vector<T>& data, const std::vector<T>& values, unsigned long n,
+                    bool inPlace, bool expectSplit) {
     const std::uint32_t parameter = bitsOf<T> - 1 - static_cast<std::uint32_t>(n % 3);
     AlignedBuffer<T> dataBuffer(n + 1), outBuffer(n + 1);
     T* const dataAt = dataBuffer.data() + 1;
@@ -206,7 +208,9 @@ TYPED_TEST(BitsetFamilies, SetBitFromValues) {
 // elements (limit 1), with every input broadcast or not, and in place.
 struct WeightedSum {
     unsigned long operator()(unsigned long a) const { return 3 * a + 1; }
-    unsigned long operator()(unsigned long a, short b) const { return 3 * a + static_cast<unsigned long>(b); }
+    unsigned long operator()(unsigned long a, short b) const {
+        return 3 * a + static_cast<unsigned long>(b);
+    }
     unsigned long operator()(unsigned long a, short b, bool c) const {
         return c ? (*this)(a, b) : a - static_cast<unsigned long>(b);
     }
@@ -223,10 +227,12 @@ TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
         for (unsigned long s2 : {0ul, 1ul})
             for (unsigned long s3 : {0ul, 1ul})
                 for (unsigned long limit : {n + 1, n, 1ul}) {
-                    SCOPED_TRACE(testing::Message() << "strides " << s1 << s2 << s3 << " limit " << limit);
+                    SCOPED_TRACE(testing::Message()
+                                 << "strides " << s1 << s2 << s3 << " limit " << limit);
                     std::vector<unsigned long> one(n), two(n), three(n);
                     runVectorOp(
-                        bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{a.data(), one.data(), s1, n, {}},
+                        bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{
+                            a.data(), one.data(), s1, n, {}},
                         limit);
                     runVectorOp(
                         bitfcnsTwoInputVectorOp<unsigned long, short, WeightedSum>{
@@ -251,7 +257,8 @@ TEST(PlainVectorOps, InPlaceSplitRun) {
     constexpr unsigned long n = 5000;
     std::vector<unsigned long> data = testValues<unsigned long>(n, 9);
     const std::vector<unsigned long> original = data;
-    runVectorOp(bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{data.data(), data.data(), 1, n, {}}, 1);
+    runVectorOp(
+        bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{data.data(), data.data(), 1, n, {}}, 1);
     for (unsigned long i = 0; i < n; ++i) ASSERT_EQ(data[i], WeightedSum{}(original[i])) << i;
 }
 
