@@ -5,6 +5,8 @@
 // access is ever unaligned.
 #pragma once
 
+#include "engine/prefetch.hpp"
+
 #include <emmintrin.h>
 
 #include <algorithm>
@@ -62,6 +64,7 @@ template <class T> class StreamedInput {
 public:
     explicit StreamedInput(const T* p) noexcept : p_(p) {}
     __m128i next() noexcept {
+        prefetchAhead(p_);
         const __m128i v = _mm_load_si128(reinterpret_cast<const __m128i*>(p_));
         p_ += lanesOf<T>;
         return v;

@@ -7,6 +7,7 @@
 // concurrently. The result is always written with unit stride.
 #pragma once
 
+#include "engine/prefetch.hpp"
 #include "engine/simd_loops.hpp"
 
 #include <tbb/blocked_range.h>
@@ -28,7 +29,10 @@ template <class In, class Ftor> struct bitfcnsOneInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i) out[i] = ftor(in[i * stride]);
+        for (unsigned long i = range.begin(); i != range.end(); ++i) {
+            prefetchAhead(in + i * stride);
+            out[i] = ftor(in[i * stride]);
+        }
     }
 };
 
@@ -43,8 +47,11 @@ template <class In1, class In2, class Ftor> struct bitfcnsTwoInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i)
+        for (unsigned long i = range.begin(); i != range.end(); ++i) {
+            prefetchAhead(in1 + i * stride1);
+            prefetchAhead(in2 + i * stride2);
             out[i] = ftor(in1[i * stride1], in2[i * stride2]);
+        }
     }
 };
 
@@ -61,8 +68,12 @@ template <class In1, class In2, class In3, class Ftor> struct bitfcnsThreeInputV
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i)
+        for (unsigned long i = range.begin(); i != range.end(); ++i) {
+            prefetchAhead(in1 + i * stride1);
+            prefetchAhead(in2 + i * stride2);
+            prefetchAhead(in3 + i * stride3);
             out[i] = ftor(in1[i * stride1], in2[i * stride2], in3[i * stride3]);
+        }
     }
 };
 
