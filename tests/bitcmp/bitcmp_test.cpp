@@ -78,14 +78,6 @@ TYPED_TEST(IntegerOperand, ComplementsInItsOwnClass) {
     EXPECT_EQ(elementsOf<T>(shared.get()), expected);
 }
 
-TYPED_TEST(IntegerOperand, EmptyGivesEmpty) {
-    const auto operand = makeOf(std::vector<TypeParam>{}, {0, 3});
-    const auto outcome = bitcmp({operand.get()});
-    ASSERT_EQ(outcome.error, "");
-    EXPECT_EQ(host::dimensions(*outcome.result), (host::Dims{0, 3}));
-    EXPECT_EQ(host::classOf(*outcome.result), classIdOf<TypeParam>);
-}
-
 // The register scan of the double path answers as the element test does,
 // element by element, wherever a failing value stands and however the data
 // is aligned.

@@ -205,7 +205,7 @@ TYPED_TEST(BitsetFamilies, SetBitFromValues) {
 }
 
 // Plain records: the same elements serially and when split down to single
-// elements (limit 1), with every input broadcast or not, and in place.
+// elements (limit 1), with every input broadcast or not.
 struct WeightedSum {
     unsigned long operator()(unsigned long a) const { return 3 * a + 1; }
     unsigned long operator()(unsigned long a, short b) const {
@@ -251,22 +251,6 @@ TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
                         ASSERT_EQ(three[i], WeightedSum{}(x, y, z)) << i;
                     }
                 }
-}
-
-TEST(PlainVectorOps, InPlaceSplitRun) {
-    constexpr unsigned long n = 5000;
-    std::vector<unsigned long> data = testValues<unsigned long>(n, 9);
-    const std::vector<unsigned long> original = data;
-    runVectorOp(
-        bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{data.data(), data.data(), 1, n, {}}, 1);
-    for (unsigned long i = 0; i < n; ++i) ASSERT_EQ(data[i], WeightedSum{}(original[i])) << i;
-}
-
-TEST(PlainVectorOps, EmptyRunReadsAndWritesNothing) {
-    unsigned long out = 42;
-    runVectorOp(bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{nullptr, &out, 1, 0, {}},
-                limits::bitcmpOnDouble);
-    EXPECT_EQ(out, 42);
 }
 
 }  // namespace
