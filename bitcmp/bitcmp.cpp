@@ -1,1 +1,92 @@
-// bitcmp: entry point, integer and double paths.
+// bitcmp: the entry point, the integer path (the host's complement loop) and
+// the double path (validation of the assumed class, then BitcmpFtor<T>).
+#include "bitcmp/bitcmp_ftor.hpp"
+#include "bitcmp/element_scan.hpp"
+#include "bitfcns/entry_points.hpp"
+#include "engine/parallel_limits.hpp"
+#include "engine/vector_ops.hpp"
+#include "frame/array.hpp"
+#include "frame/assumed_type.hpp"
+#include "frame/class_types.hpp"
+#include "frame/exception.hpp"
+#include "frame/message_tags.hpp"
+#include "host/math_utils.hpp"
+
+namespace bitfcns {
+namespace {
+
+namespace errors = VESPRA::bitcmp;
+
+// The result: the operand's own storage where the host allows it, otherwise
+// a new real array of the operand's sizes and class `cls`.
+zqArraySlot makeResult(const zqArray_tag* operand, zqClassID cls) {
+    if (wantsSharedResult(operand)) return shareResult(operand);
+    return createResult(numberOfDimensions(operand), dimensionsOf(operand), cls);
+}
+
+void bitcmpIntegerOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    const zqArray_tag* operand = prhs[0];
+    if (isComplex(operand)) raiseError<errors::complexOperands>();
+    const unsigned long n = numberOfElements(operand);
+    const zqClassID cls = classOf(operand);
+    if (nrhs == 2) {
+        const zqClassID named = parseAssumedType(prhs[1]);
+        if (named == zqNoClass) raiseError<errors::unknownTypeString>();
+        if (named != cls) raiseError<errors::invalidTypeString>();
+    }
+    zqArraySlot result = makeResult(operand, cls);
+    visitClass<IntegerClasses>(
+        cls,
+        [&]<class Tag>(Tag) {
+            using T = typename Tag::type;
+            mu::IntVectorBitcmp<T>(dataOf<T>(result.get()), dataOf<T>(operand), 1, 1, n);
+        },
+        [] { raiseError<errors::firstArgNotInt>(); });
+    plhs[0] = std::move(result);
+}
+
+// Every element is tested before any is written, so a refused call leaves
+// an operand whose storage the result shares untouched.
+template <class T> void bitcmpDoubleDriver(const zqArray_tag* operand, zqArray_tag* result) {
+    const unsigned long n = numberOfElements(result);
+    if (n == 0) return;
+    const double* in = dataOf<double>(operand);
+    if (!allFitInteger<T>(in, n)) raiseError<errors::outOfRange>();
+    runVectorOp(
+        bitfcnsOneInputVectorOp<double, BitcmpFtor<T>>{in, dataOf<double>(result), 1, n, {}},
+        limits::bitcmpOnDouble);
+}
+
+void bitcmpDoubleOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    const zqArray_tag* operand = prhs[0];
+    if (isSparse(operand)) raiseError<errors::sparseArgs>();
+    if (isComplex(operand)) raiseError<errors::complexOperands>();
+    const zqClassID assumed = nrhs == 2 ? parseAssumedType(prhs[1]) : zqUInt64Class;
+    // The assumed class is tested after the result exists, which the
+    // exception then destroys.
+    zqArraySlot result = makeResult(operand, zqDoubleClass);
+    visitClass<IntegerClasses>(
+        assumed,
+        [&]<class Tag>(Tag) { bitcmpDoubleDriver<typename Tag::type>(operand, result.get()); },
+        [] { raiseError<errors::unknownTypeString>(); });
+    plhs[0] = std::move(result);
+}
+
+}  // namespace
+}  // namespace bitfcns
+
+void ondelBitCmpFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    using namespace bitfcns;
+    if (nlhs > 1) matrix::detail::error_maxlhs();
+    if (nrhs > 2) matrix::detail::error_maxrhs();
+    if (nrhs < 1) matrix::detail::error_minrhs();
+    // The stored id, unresolved: an opaque id is refused like any other class.
+    const zqClassID stored = prhs[0]->classId;
+    if (stored == zqDoubleClass) {
+        bitcmpDoubleOperand(nlhs, plhs, nrhs, prhs);
+    } else if (stored >= zqInt8Class && stored <= zqUInt64Class) {
+        bitcmpIntegerOperand(nlhs, plhs, nrhs, prhs);
+    } else {
+        raiseError<VESPRA::bitcmp::firstArgNotInt>();
+    }
+}

@@ -1,0 +1,180 @@
+// The two strided loops that divide a run of elements between an SSE2 functor
+// and its scalar twin: unarySIMDApply and binarySIMDApply. The twin does the
+// head before alignment, the tail that doesn't fill a register and every run
+// too short for one; the vector functor does the aligned body. No vector
+// access is ever unaligned.
+#pragma once
+
+#include "engine/prefetch.hpp"
+
+#include <emmintrin.h>
+
+#include <algorithm>
+#include <cstdint>
+#include <initializer_list>
+
+namespace bitfcns {
+
+// Elements of T in one 16-byte register.
+template <class T> inline constexpr unsigned long lanesOf = 16 / sizeof(T);
+
+namespace simd_detail {
+
+inline constexpr std::uintptr_t registerAlignment = 16;
+
+inline std::uintptr_t addressOf(const void* p) noexcept {
+    return reinterpret_cast<std::uintptr_t>(p);
+}
+
+// How many leading elements the twin must take before all `pointers` are
+// 16-byte aligned at one and the same element: `n` when that never happens,
+// because they differ in their position modulo 16.
+template <class T>
+unsigned long headLength(unsigned long n, std::initializer_list<const T*> pointers) noexcept {
+    const std::uintptr_t position = addressOf(*pointers.begin()) % registerAlignment;
+    for (const T* p : pointers)
+        if (addressOf(p) % registerAlignment != position) return n;
+    if (position % sizeof(T) != 0) return n;
+    const unsigned long toBoundary = (registerAlignment - position) % registerAlignment / sizeof(T);
+    return std::min(n, toBoundary);
+}
+
+// The scalar twin over `n` elements, each pointer stepping by its stride and
+// left past the run. Kept out of the auto-vectorizer: it would turn these
+// loops into unaligned vector loads and stores, which the engine never makes.
+template <class T, class ScalarFtor>
+[[gnu::optimize("no-tree-vectorize")]] void scalarRun(T*& out, const T*& in,
+                                                      unsigned long outStride, unsigned long stride,
+                                                      unsigned long n,
+                                                      ScalarFtor scalarFtor) noexcept {
+    for (; n != 0; --n, out += outStride, in += stride) *out = scalarFtor(*in);
+}
+template <class T, class ScalarFtor>
+[[gnu::optimize("no-tree-vectorize")]] void scalarRun(T*& out, const T*& in1, const T*& in2,
+                                                      unsigned long outStride,
+                                                      unsigned long stride1, unsigned long stride2,
+                                                      unsigned long n,
+                                                      ScalarFtor scalarFtor) noexcept {
+    for (; n != 0; --n, out += outStride, in1 += stride1, in2 += stride2)
+        *out = scalarFtor(*in1, *in2);
+}
+
+// An input read straight from memory, one aligned register per step.
+template <class T> class StreamedInput {
+public:
+    explicit StreamedInput(const T* p) noexcept : p_(p) {}
+    __m128i next() noexcept {
+        prefetchAhead(p_);
+        const __m128i v = _mm_load_si128(reinterpret_cast<const __m128i*>(p_));
+        p_ += lanesOf<T>;
+        return v;
+    }
+
+private:
+    const T* p_;
+};
+
+// A broadcast input (stride 0): an aligned buffer of L copies of its one
+// element, filled and loaded once before the body; the register stays
+// loop-invariant.
+template <class T> class BroadcastInput {
+public:
+    explicit BroadcastInput(const T* p) noexcept {
+        alignas(16) T buffer[lanesOf<T>];
+        std::fill_n(buffer, lanesOf<T>, *p);
+        register_ = _mm_load_si128(reinterpret_cast<const __m128i*>(buffer));
+    }
+    __m128i next() const noexcept { return register_; }
+
+private:
+    __m128i register_;
+};
+
+// The body: `blocks` registers, each with aligned loads of the inputs, the
+// vector operation, and an aligned store. No unrolling.
+template <class T, class VectorOp, class... Inputs>
+void alignedBody(T* out, unsigned long blocks, VectorOp op, Inputs... inputs) noexcept {
+    for (; blocks != 0; --blocks, out += lanesOf<T>)
+        _mm_store_si128(reinterpret_cast<__m128i*>(out), op(inputs.next()...));
+}
+
+}  // namespace simd_detail
+
+// out[i * outStride] = scalarFtor(in[i * stride]) for i below n, computed in
+// registers where `in` and `out` are both contiguous. The loop for other
+// strides isn't built (the library never passes them): the twin does those
+// runs alone.
+template <class T, class SimdFtor, class ScalarFtor>
+void unarySIMDApply(T* out, const T* in, unsigned long outStride, unsigned long stride,
+                    unsigned long n, SimdFtor simdFtor, ScalarFtor scalarFtor) noexcept {
+    constexpr unsigned long lanes = lanesOf<T>;
+    if (n == 0) return;
+    if (n < lanes || stride != 1 || outStride != 1) {
+        simd_detail::scalarRun(out, in, outStride, stride, n, scalarFtor);
+        return;
+    }
+
+    // Head: the twin until `in` and `out` are aligned at the same element.
+    const unsigned long head = simd_detail::headLength<T>(n, {out, in});
+    simd_detail::scalarRun(out, in, 1, 1, head, scalarFtor);
+    n -= head;
+
+    // Body.
+    const unsigned long blocks = n / lanes;
+    simd_detail::alignedBody(out, blocks, simdFtor.template prepare<T>(),
+                             simd_detail::StreamedInput<T>(in));
+    out += blocks * lanes;
+    in += blocks * lanes;
+
+    // Tail.
+    simd_detail::scalarRun(out, in, 1, 1, n % lanes, scalarFtor);
+}
+
+// out[i * outStride] = scalarFtor(in1[i * stride1], in2[i * stride2]) for i
+// below n. With a unit output, three loops use registers: both inputs
+// contiguous (the unit loop), `in1` contiguous and `in2` broadcast (the
+// first-unit loop), `in1` broadcast and `in2` contiguous (the second-unit
+// loop). The loops for other strides aren't built (the library never passes
+// them): the twin does those runs alone.
+template <class T, class SimdFtor, class ScalarFtor>
+void binarySIMDApply(T* out, const T* in1, const T* in2, unsigned long outStride,
+                     unsigned long stride1, unsigned long stride2, unsigned long n,
+                     SimdFtor simdFtor, ScalarFtor scalarFtor) noexcept {
+    using simd_detail::BroadcastInput;
+    using simd_detail::StreamedInput;
+    constexpr unsigned long lanes = lanesOf<T>;
+    if (n == 0) return;
+    const bool unitLoop = stride1 == 1 && stride2 == 1;
+    const bool firstUnitLoop = stride1 == 1 && stride2 == 0;
+    const bool secondUnitLoop = stride1 == 0 && stride2 == 1;
+    if (n < lanes || outStride != 1 || !(unitLoop || firstUnitLoop || secondUnitLoop)) {
+        simd_detail::scalarRun(out, in1, in2, outStride, stride1, stride2, n, scalarFtor);
+        return;
+    }
+
+    // Head: the twin until `out` and the contiguous inputs are aligned at the
+    // same element; a broadcast input steps by 0 meanwhile.
+    const unsigned long head =
+        unitLoop ? simd_detail::headLength<T>(n, {out, in1, in2})
+                 : simd_detail::headLength<T>(n, {out, firstUnitLoop ? in1 : in2});
+    simd_detail::scalarRun(out, in1, in2, 1, stride1, stride2, head, scalarFtor);
+    n -= head;
+
+    // Body.
+    const unsigned long blocks = n / lanes;
+    const auto op = simdFtor.template prepare<T>();
+    if (unitLoop)
+        simd_detail::alignedBody(out, blocks, op, StreamedInput<T>(in1), StreamedInput<T>(in2));
+    else if (firstUnitLoop)
+        simd_detail::alignedBody(out, blocks, op, StreamedInput<T>(in1), BroadcastInput<T>(in2));
+    else
+        simd_detail::alignedBody(out, blocks, op, BroadcastInput<T>(in1), StreamedInput<T>(in2));
+    out += blocks * lanes;
+    in1 += blocks * lanes * stride1;
+    in2 += blocks * lanes * stride2;
+
+    // Tail.
+    simd_detail::scalarRun(out, in1, in2, 1, stride1, stride2, n % lanes, scalarFtor);
+}
+
+}  // namespace bitfcns
