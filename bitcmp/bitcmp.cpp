@@ -1,7 +1,7 @@
 // bitcmp: the entry point, the integer path (the host's complement loop) and
 // the double path (validation of the assumed class, then BitcmpFtor<T>).
 #include "bitcmp/bitcmp_ftor.hpp"
-#include "bitcmp/element_scan.hpp"
+#include "frame/element_scan.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine/vector_ops.hpp"

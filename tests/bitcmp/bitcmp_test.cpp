@@ -2,7 +2,6 @@
 // order of refusals, results that take over a flagged operand's storage,
 // values at the bounds, the rounding of 64-bit complements, and no array
 // left behind by a refused call or a failed allocation.
-#include "bitcmp/element_scan.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "frame/floating.hpp"
 #include "host/array_factory.hpp"
@@ -76,48 +75,6 @@ TYPED_TEST(IntegerOperand, ComplementsInItsOwnClass) {
     ASSERT_EQ(inPlace.error, "");
     EXPECT_EQ(host::storageIdentity(*inPlace.result), host::storageIdentity(*shared));
     EXPECT_EQ(elementsOf<T>(shared.get()), expected);
-}
-
-// The register scan of the double path answers as the element test does,
-// element by element, wherever a failing value stands and however the data
-// is aligned.
-TYPED_TEST(IntegerOperand, ScanAgreesWithTheElementTest) {
-    using T = TypeParam;
-    using Bounds = bitfcns::IntegerBounds<T>;
-    const double edges[] = {Bounds::lowest,
-                            Bounds::lowest - 1,
-                            Bounds::highest,
-                            Bounds::highest + 1,
-                            std::nextafter(Bounds::highest, 0.0),
-                            std::nextafter(Bounds::lowest, 0.0),
-                            0.5,
-                            -0.5,
-                            -0.0,
-                            1.5,
-                            4503599627370495.5,
-                            4503599627370496.0,
-                            9007199254740993.0,
-                            9223372036854775808.0,
-                            18446744073709551616.0,
-                            -1.0,
-                            255.0,
-                            256.0,
-                            nan,
-                            inf,
-                            -inf,
-                            1e300,
-                            -1e300};
-    alignas(16) double data[12] = {};
-    for (double edge : edges)
-        for (std::size_t offset : {0, 1})
-            for (std::size_t length = 1; length + offset <= 12; ++length)
-                for (std::size_t at = offset; at < offset + length; ++at) {
-                    std::fill(std::begin(data), std::end(data), 0.0);
-                    data[at] = edge;
-                    ASSERT_EQ(bitfcns::allFitInteger<T>(data + offset, length),
-                              bitfcns::fitsInteger<T>(edge))
-                        << edge << " at " << at << " of " << offset << ".." << offset + length;
-                }
 }
 
 // Double operands: one row per assumed class, with the values at its bounds.

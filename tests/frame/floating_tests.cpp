@@ -1,11 +1,13 @@
 // Floor by bit pattern against std::floor, and the element test at the
 // bounds of every integer class, alone and over host arrays.
 #include "frame/class_types.hpp"
+#include "frame/element_scan.hpp"
 #include "frame/floating.hpp"
 #include "host/array_factory.hpp"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <bit>
 #include <cmath>
 #include <limits>
@@ -138,6 +140,48 @@ TEST(ElementTest, UnknownWorkingClassUsesInt64Bounds) {
     const auto array = host::makeArray<double>(zqDoubleClass, {2, 1}, values);
     EXPECT_TRUE(fitsIntegerClass(array.get(), zqNoClass));
     EXPECT_FALSE(fitsIntegerClass(host::makeDoubleScalar(two63).get(), zqNoClass));
+}
+
+// The register scan of whole arrays answers as the element test does,
+// element by element, wherever a failing value stands and however the data
+// is aligned.
+TYPED_TEST(ElementTestByClass, ScanAgreesWithTheElementTest) {
+    using T = typename TypeParam::type;
+    using Bounds = bitfcns::IntegerBounds<T>;
+    const double edges[] = {Bounds::lowest,
+                            Bounds::lowest - 1,
+                            Bounds::highest,
+                            Bounds::highest + 1,
+                            std::nextafter(Bounds::highest, 0.0),
+                            std::nextafter(Bounds::lowest, 0.0),
+                            0.5,
+                            -0.5,
+                            -0.0,
+                            1.5,
+                            4503599627370495.5,
+                            4503599627370496.0,
+                            9007199254740993.0,
+                            9223372036854775808.0,
+                            18446744073709551616.0,
+                            -1.0,
+                            255.0,
+                            256.0,
+                            nan,
+                            inf,
+                            -inf,
+                            1e300,
+                            -1e300};
+    alignas(16) double data[12] = {};
+    for (double edge : edges)
+        for (std::size_t offset : {0, 1})
+            for (std::size_t length = 1; length + offset <= 12; ++length)
+                for (std::size_t at = offset; at < offset + length; ++at) {
+                    std::fill(std::begin(data), std::end(data), 0.0);
+                    data[at] = edge;
+                    ASSERT_EQ(bitfcns::allFitInteger<T>(data + offset, length),
+                              bitfcns::fitsInteger<T>(edge))
+                        << edge << " at " << at << " of " << offset << ".." << offset + length;
+                }
 }
 
 }  // namespace

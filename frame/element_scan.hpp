@@ -2,7 +2,6 @@
 // two elements per SSE2 register and without a branch per element.
 #pragma once
 
-#include "engine/prefetch.hpp"
 #include "frame/floating.hpp"
 
 #include <emmintrin.h>
@@ -20,7 +19,8 @@ namespace scan_detail {
 // below 2^52 is whole exactly when adding and subtracting 2^52 gives it back,
 // in any rounding mode, since the sum lies where doubles are one apart; from
 // 2^52 up every double is whole, which capping the magnitude at 2^52 keeps.
-template <class T> struct LaneTest {
+template <class T>
+struct LaneTest {
     using Bounds = IntegerBounds<T>;
     const __m128d twoTo52 = _mm_set1_pd(4503599627370496.0);
     const __m128d signBit = _mm_set1_pd(-0.0);
@@ -46,7 +46,8 @@ template <class T> struct LaneTest {
 // element test of fitsInteger<T>, two lanes at a time. The answer is that of
 // testing the elements in order and stopping at the first failure; the stop
 // comes at the end of the failing element's block.
-template <class T> bool allFitInteger(const double* data, unsigned long n) noexcept {
+template <class T>
+bool allFitInteger(const double* data, unsigned long n) noexcept {
     // The first element alone when it isn't on a register boundary.
     if (n != 0 && reinterpret_cast<std::uintptr_t>(data) % 16 != 0) {
         if (!fitsInteger<T>(*data)) return false;
@@ -60,7 +61,9 @@ template <class T> bool allFitInteger(const double* data, unsigned long n) noexc
         const unsigned long end = std::min(even, block + blockElements);
         __m128d pass0 = _mm_castsi128_pd(_mm_set1_epi32(-1)), pass1 = pass0;
         for (unsigned long i = block; i < end; i += 4) {
-            prefetchAhead(data + i);
+            // The hardware prefetchers don't keep one core's loads ahead of
+            // memory here; ask for the data 2 KiB ahead.
+            __builtin_prefetch(data + i + 256);
             pass0 = _mm_and_pd(pass0, test(_mm_load_pd(data + i)));
             pass1 = _mm_and_pd(pass1, test(_mm_load_pd(data + i + 2)));
         }
