@@ -1,13 +1,13 @@
 // bitcmp: the entry point, the integer path (the host's complement loop) and
 // the double path (validation of the assumed class, then BitcmpFtor<T>).
 #include "bitcmp/bitcmp_ftor.hpp"
-#include "frame/element_scan.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/array.hpp"
 #include "frame/assumed_type.hpp"
 #include "frame/class_types.hpp"
+#include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
 #include "frame/message_tags.hpp"
 #include "host/math_utils.hpp"
