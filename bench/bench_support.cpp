@@ -66,35 +66,45 @@ benchmark::internal::Benchmark* registerCounts(const std::string& name,
     return bench;
 }
 
-template <> zqClassID classIdOf<signed char>() {
+template <>
+zqClassID classIdOf<signed char>() {
     return zqInt8Class;
 }
-template <> zqClassID classIdOf<unsigned char>() {
+template <>
+zqClassID classIdOf<unsigned char>() {
     return zqUInt8Class;
 }
-template <> zqClassID classIdOf<short>() {
+template <>
+zqClassID classIdOf<short>() {
     return zqInt16Class;
 }
-template <> zqClassID classIdOf<unsigned short>() {
+template <>
+zqClassID classIdOf<unsigned short>() {
     return zqUInt16Class;
 }
-template <> zqClassID classIdOf<int>() {
+template <>
+zqClassID classIdOf<int>() {
     return zqInt32Class;
 }
-template <> zqClassID classIdOf<unsigned int>() {
+template <>
+zqClassID classIdOf<unsigned int>() {
     return zqUInt32Class;
 }
-template <> zqClassID classIdOf<long>() {
+template <>
+zqClassID classIdOf<long>() {
     return zqInt64Class;
 }
-template <> zqClassID classIdOf<unsigned long>() {
+template <>
+zqClassID classIdOf<unsigned long>() {
     return zqUInt64Class;
 }
-template <> zqClassID classIdOf<double>() {
+template <>
+zqClassID classIdOf<double>() {
     return zqDoubleClass;
 }
 
-template <class T> const char* className() {
+template <class T>
+const char* className() {
     constexpr const char* names[] = {"double", "single", "int8",   "uint8", "int16",
                                      "uint16", "int32",  "uint32", "int64", "uint64"};
     return names[classIdOf<T>() - zqDoubleClass];

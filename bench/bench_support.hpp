@@ -43,8 +43,10 @@ benchmark::internal::Benchmark* registerCounts(const std::string& name,
                                                const std::vector<long>& counts);
 
 // The host class of an element type, and its name: "uint8", "double".
-template <class T> zqClassID classIdOf();
-template <class T> const char* className();
+template <class T>
+zqClassID classIdOf();
+template <class T>
+const char* className();
 
 // A new host array of n elements of class `cls` in one row, with undefined
 // contents, made the way a result is made.

@@ -20,7 +20,8 @@ constexpr unsigned long kCount = 5'000'000;
 template <class T>
 zqArraySlot operandOf(unsigned long n, unsigned seed) {
     std::vector<T> values(n);
-    for (unsigned long i = 0; i < n; ++i) values[i] = static_cast<T>((i * 2654435761u + seed) % 251);
+    for (unsigned long i = 0; i < n; ++i)
+        values[i] = static_cast<T>((i * 2654435761u + seed) % 251);
     return host::makeArray(classIdOf<T>(), {1, n}, std::span<const T>(values));
 }
 
@@ -47,10 +48,11 @@ void logicCase(benchmark::State& state) {
 template <EntryPoint entry>
 void registerFunction(const std::string& function) {
     const std::vector<long> counts{static_cast<long>(kCount)};
-    registerCounts(function + "/onInteger/uint8", &logicCase<entry, unsigned char, unsigned char>, counts);
-    registerCounts(function + "/onDouble/double", &logicCase<entry, double, double>, counts);
-    registerCounts(function + "/onInteger/uint8-doubleScalar", &logicCase<entry, unsigned char, double>,
+    registerCounts(function + "/onInteger/uint8", &logicCase<entry, unsigned char, unsigned char>,
                    counts);
+    registerCounts(function + "/onDouble/double", &logicCase<entry, double, double>, counts);
+    registerCounts(function + "/onInteger/uint8-doubleScalar",
+                   &logicCase<entry, unsigned char, double>, counts);
 }
 
 [[maybe_unused]] const bool registered = [] {

@@ -21,7 +21,8 @@ enum class Output { fresh, inPlace };
 // Operand values that stay valid under repeated complements in place: for
 // doubles, multiples of 2^60 whose uint64 complements round to multiples of
 // 2^60 again.
-template <class T> std::vector<T> operandValues(unsigned long n) {
+template <class T>
+std::vector<T> operandValues(unsigned long n) {
     std::vector<T> values(n);
     for (unsigned long i = 0; i < n; ++i) {
         if constexpr (std::is_same_v<T, double>)
@@ -32,7 +33,8 @@ template <class T> std::vector<T> operandValues(unsigned long n) {
     return values;
 }
 
-template <class T, Output output> void bitcmpCase(benchmark::State& state) {
+template <class T, Output output>
+void bitcmpCase(benchmark::State& state) {
     const auto n = static_cast<unsigned long>(state.range(0));
     const std::vector<T> values = operandValues<T>(n);
     const zqArraySlot operand = host::makeArray(classIdOf<T>(), {1, n}, std::span<const T>(values));
@@ -49,7 +51,8 @@ template <class T, Output output> void bitcmpCase(benchmark::State& state) {
     reportBytes(state, 2 * sizeof(T) * n);
 }
 
-template <class T> void registerBitcmp(const char* path) {
+template <class T>
+void registerBitcmp(const char* path) {
     const std::string name = std::string("bitcmp/") + path + "/" + className<T>();
     const auto counts = countsAroundLimit(limits::bitcmpOnDouble);
     registerCounts(name + "/fresh", &bitcmpCase<T, Output::fresh>, counts);

@@ -24,7 +24,8 @@ namespace {
 struct SetOneBit {
     static constexpr const char* name = "setOneBit";
     static constexpr std::size_t elementsMoved = 2;
-    template <class T> static constexpr unsigned long limit = limits::setOneBit<T>;
+    template <class T>
+    static constexpr unsigned long limit = limits::setOneBit<T>;
     template <class T>
     static auto record(T* out, const T* data, const T*, const T* mask, unsigned long n,
                        std::uint32_t) {
@@ -35,7 +36,8 @@ struct SetOneBit {
 struct ClearOneBit {
     static constexpr const char* name = "clearOneBit";
     static constexpr std::size_t elementsMoved = 2;
-    template <class T> static constexpr unsigned long limit = limits::clearOneBit<T>;
+    template <class T>
+    static constexpr unsigned long limit = limits::clearOneBit<T>;
     template <class T>
     static auto record(T* out, const T* data, const T*, const T* mask, unsigned long n,
                        std::uint32_t) {
@@ -46,7 +48,8 @@ struct ClearOneBit {
 struct GetOneBit {
     static constexpr const char* name = "getOneBit";
     static constexpr std::size_t elementsMoved = 2;
-    template <class T> static constexpr unsigned long limit = limits::getOneBit<T>;
+    template <class T>
+    static constexpr unsigned long limit = limits::getOneBit<T>;
     template <class T>
     static auto record(T* out, const T* data, const T*, const T* one, unsigned long n,
                        std::uint32_t p) {
@@ -57,7 +60,8 @@ struct GetOneBit {
 struct SetBitFromValues {
     static constexpr const char* name = "setBitFromValues";
     static constexpr std::size_t elementsMoved = 3;
-    template <class T> static constexpr unsigned long limit = limits::setBitFromValues<T>;
+    template <class T>
+    static constexpr unsigned long limit = limits::setBitFromValues<T>;
     template <class T>
     static auto record(T* out, const T* data, const T* values, const T*, unsigned long n,
                        std::uint32_t p) {
@@ -68,7 +72,8 @@ struct SetBitFromValues {
 struct LeftShift {
     static constexpr const char* name = "leftShift";
     static constexpr std::size_t elementsMoved = 2;
-    template <class T> static constexpr unsigned long limit = limits::leftShift<T>;
+    template <class T>
+    static constexpr unsigned long limit = limits::leftShift<T>;
     template <class T>
     static auto record(T* out, const T* data, const T*, const T*, unsigned long n,
                        std::uint32_t p) {
@@ -79,7 +84,8 @@ struct LeftShift {
 struct RightShift {
     static constexpr const char* name = "rightShift";
     static constexpr std::size_t elementsMoved = 2;
-    template <class T> static constexpr unsigned long limit = limits::rightShift<T>;
+    template <class T>
+    static constexpr unsigned long limit = limits::rightShift<T>;
     template <class T>
     static auto record(T* out, const T* data, const T*, const T*, unsigned long n,
                        std::uint32_t p) {
@@ -90,7 +96,8 @@ struct RightShift {
 
 enum class Output { fresh, inPlace };
 
-template <class Family, class T, Output output> void familyCase(benchmark::State& state) {
+template <class Family, class T, Output output>
+void familyCase(benchmark::State& state) {
     const auto n = static_cast<unsigned long>(state.range(0));
     std::vector<T> data(n, T(0x5A));
     std::vector<T> values(Family::elementsMoved == 3 ? n : 0, T(1));
@@ -110,7 +117,8 @@ template <class Family, class T, Output output> void familyCase(benchmark::State
     reportBytes(state, Family::elementsMoved * sizeof(T) * n);
 }
 
-template <class Family, class T> void registerFamily() {
+template <class Family, class T>
+void registerFamily() {
     const std::string name = std::string("engine/") + Family::name + "/" + className<T>();
     const auto counts = countsAroundLimit(Family::template limit<T>);
     registerCounts(name + "/fresh", &familyCase<Family, T, Output::fresh>, counts);

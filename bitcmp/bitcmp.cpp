@@ -47,7 +47,8 @@ void bitcmpIntegerOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** 
 
 // Every element is tested before any is written, so a refused call leaves
 // an operand whose storage the result shares untouched.
-template <class T> void bitcmpDoubleDriver(const zqArray_tag* operand, zqArray_tag* result) {
+template <class T>
+void bitcmpDoubleDriver(const zqArray_tag* operand, zqArray_tag* result) {
     const unsigned long n = numberOfElements(result);
     if (n == 0) return;
     const double* in = dataOf<double>(operand);

@@ -30,7 +30,8 @@ inline double unsigned64ToDouble(std::uint64_t v) noexcept {
 // x, a whole number that class T holds (tested before), complemented in T:
 // minus x minus 1 for signed T, the largest value of T minus x for unsigned
 // T. With the 64-bit classes the complement is rounded to the nearest double.
-template <class T> struct BitcmpFtor {
+template <class T>
+struct BitcmpFtor {
     double operator()(double x) const noexcept {
         if constexpr (sizeof(T) < 4 || std::is_same_v<T, int>) {
             return static_cast<double>(static_cast<T>(~static_cast<std::int32_t>(x)));

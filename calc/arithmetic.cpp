@@ -7,10 +7,10 @@
 // integer results, which holds every 64-bit integer exactly.
 #include "calc/arithmetic.hpp"
 
-#include "calc/class_tags.hpp"
 #include "calc/element_cast.hpp"
 #include "calc/errors.hpp"
 #include "calc/text_join.hpp"
+#include "host/element_types.hpp"
 
 #include <cmath>
 #include <string>
@@ -53,7 +53,7 @@ C readAs(const void* data, std::size_t index) {
 
 template <class C>
 Reader<C> readerFor(zqClassID cls) {
-    return visitClass<ElementClasses>(
+    return host::visitElementClass<host::StoredElements>(
         cls, []<class Tag>(Tag) -> Reader<C> { return &readAs<C, typename Tag::type>; },
         []() -> Reader<C> { return nullptr; });
 }
@@ -72,13 +72,13 @@ void requireArithmeticOperand(const zqArray_tag& operand, std::string_view symbo
 }
 
 zqClassID resultClassOf(zqClassID left, zqClassID right) {
-    if (isIntegerClass(left) && isIntegerClass(right) && left != right) {
+    if (host::isIntegerClass(left) && host::isIntegerClass(right) && left != right) {
         throw CalcError(errorid::classMismatch,
                         joinText("Integers of different classes can't be combined: ",
                                  className(left), " with ", className(right), "."));
     }
-    if (isIntegerClass(left)) return left;
-    if (isIntegerClass(right)) return right;
+    if (host::isIntegerClass(left)) return left;
+    if (host::isIntegerClass(right)) return right;
     if (left == zqSingleClass || right == zqSingleClass) return zqSingleClass;
     return zqDoubleClass;
 }
@@ -89,7 +89,7 @@ template <class Tag>
 void combineInto(zqArray_tag& result, BinaryOperator op, const zqArray_tag& left,
                  const zqArray_tag& right) {
     using T = typename Tag::type;
-    using C = std::conditional_t<isIntegerTag<Tag>, long double, double>;
+    using C = std::conditional_t<host::isIntegerElement<Tag>, long double, double>;
     const Reader<C> readLeft = readerFor<C>(host::classOf(left));
     const Reader<C> readRight = readerFor<C>(host::classOf(right));
     const std::size_t leftStride = isScalar(left) ? 0 : 1;
@@ -124,7 +124,7 @@ zqArraySlot applyBinary(BinaryOperator op, const zqArray_tag& left, const zqArra
     }
 
     zqArraySlot result = host::makeArray(cls, dims);
-    visitClass<NumericClasses>(
+    host::visitElementClass<host::NumericElements>(
         cls, [&]<class Tag>(Tag) { combineInto<Tag>(*result, op, left, right); }, [] {});
     return result;
 }
@@ -133,13 +133,13 @@ zqArraySlot applySign(UnaryOperator op, const zqArray_tag& operand) {
     const std::string_view symbol = op == UnaryOperator::Negate ? "-" : "+";
     requireArithmeticOperand(operand, symbol);
     const zqClassID from = host::classOf(operand);
-    const zqClassID cls = isNumericClass(from) ? from : zqDoubleClass;
+    const zqClassID cls = host::isNumericClass(from) ? from : zqDoubleClass;
     const double factor = op == UnaryOperator::Negate ? -1 : 1;
     zqArraySlot sign = host::makeDoubleScalar(factor);
     // -x is computed as x * -1 in the class of x, which saturates integers
     // and keeps the sign of zero right for floating values.
     zqArraySlot result = host::makeArray(cls, host::dimensions(operand));
-    visitClass<NumericClasses>(
+    host::visitElementClass<host::NumericElements>(
         cls,
         [&]<class Tag>(Tag) {
             combineInto<Tag>(*result, BinaryOperator::Multiply, operand, *sign);

@@ -1,9 +1,9 @@
 // Small reading helpers over host arrays for the evaluator.
 #include "calc/array_access.hpp"
 
-#include "calc/class_tags.hpp"
 #include "calc/errors.hpp"
 #include "calc/text_join.hpp"
+#include "host/element_types.hpp"
 
 #include <array>
 #include <limits>
@@ -62,11 +62,9 @@ std::optional<zqClassID> numberClassNamed(std::u16string_view name) {
     return std::nullopt;
 }
 
-bool isIntegerClass(zqClassID cls) { return cls >= zqInt8Class && cls <= zqUInt64Class; }
 bool isFloatClass(zqClassID cls) { return cls == zqDoubleClass || cls == zqSingleClass; }
-bool isNumericClass(zqClassID cls) { return isIntegerClass(cls) || isFloatClass(cls); }
 bool holdsElements(zqClassID cls) {
-    return isNumericClass(cls) || cls == zqLogicalClass || cls == zqCharClass;
+    return host::isNumericClass(cls) || cls == zqLogicalClass || cls == zqCharClass;
 }
 
 std::string dimsText(const Dims& dims) {
@@ -126,7 +124,7 @@ std::optional<std::u16string> textOf(const zqArray_tag& array) {
 }
 
 double elementAsDouble(const zqArray_tag& array, std::size_t index) {
-    return visitClass<ElementClasses>(
+    return host::visitElementClass<host::StoredElements>(
         host::classOf(array),
         [&]<class Tag>(Tag) {
             return static_cast<double>(elementsOf<typename Tag::type>(array)[index]);

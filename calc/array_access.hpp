@@ -23,9 +23,7 @@ std::string className(zqClassID cls);
 // "uint64", "logical"), or nothing.
 std::optional<zqClassID> numberClassNamed(std::u16string_view name);
 
-bool isIntegerClass(zqClassID cls);
-bool isFloatClass(zqClassID cls);    // double or single
-bool isNumericClass(zqClassID cls);  // integer or floating
+bool isFloatClass(zqClassID cls);  // double or single
 // Classes whose elements are plain numbers: numeric, logical, char.
 bool holdsElements(zqClassID cls);
 
@@ -55,7 +53,6 @@ template <class T>
 T* mutableElementsOf(zqArray_tag& array) {
     return static_cast<T*>(array.data);
 }
-
 
 // The text that a char row vector, a 0-by-0 char array or a string scalar
 // holds; nothing for any other array, a missing string included.

@@ -1,10 +1,10 @@
 // Making new host arrays from others.
 #include "calc/array_building.hpp"
 
-#include "calc/class_tags.hpp"
 #include "calc/element_cast.hpp"
 #include "calc/errors.hpp"
 #include "calc/text_join.hpp"
+#include "host/element_types.hpp"
 
 #include <algorithm>
 #include <cmath>
@@ -66,7 +66,7 @@ public:
     // Negates the imaginary parts written so far.
     void conjugate() {
         if (!complex_) return;
-        visitClass<NumericClasses>(
+        host::visitElementClass<host::NumericElements>(
             cls_,
             [&]<class Tag>(Tag) {
                 using T = typename Tag::type;
@@ -233,7 +233,7 @@ zqArraySlot filledArray(zqClassID cls, const Dims& dims, double value) {
     checkArraySize(dims, cls);
     zqArraySlot array = host::makeArray(cls, dims);
     const std::size_t count = host::elementCount(*array);
-    visitClass<Append<NumericClasses, LogicalTag>::type>(
+    host::visitElementClass<host::ValueElements>(
         cls,
         [&]<class Tag>(Tag) {
             using T = typename Tag::type;

@@ -2,12 +2,12 @@
 #include "calc/builtins.hpp"
 
 #include "calc/array_building.hpp"
-#include "calc/class_tags.hpp"
 #include "calc/conversion.hpp"
 #include "calc/errors.hpp"
 #include "calc/number_text.hpp"
-#include "calc/unicode_text.hpp"
 #include "calc/text_join.hpp"
+#include "calc/unicode_text.hpp"
+#include "host/element_types.hpp"
 
 #include <array>
 #include <cmath>
@@ -42,7 +42,7 @@ std::u16string requireText(const Builtin& self, const zqArray_tag& array) {
 
 bool isRealNumber(const zqArray_tag& array) {
     const zqClassID cls = host::classOf(array);
-    return (isNumericClass(cls) || cls == zqLogicalClass) && !host::isComplex(array);
+    return (host::isNumericClass(cls) || cls == zqLogicalClass) && !host::isComplex(array);
 }
 
 // One size: a real, whole, finite, non-negative number.
@@ -109,7 +109,7 @@ zqArraySlot integerLimitBody(const Builtin& self, std::span<Value> arguments) {
     if (!arguments.empty()) {
         const std::u16string name = requireText(self, arguments[0].array());
         cls = numberClassNamed(name).value_or(zqNoClass);
-        if (!isIntegerClass(cls))
+        if (!host::isIntegerClass(cls))
             invalid(self, joinText("'", toUtf8(name), "' isn't the name of an integer class."));
     }
     return integerLimit(cls, self.fill != 0);
@@ -185,12 +185,12 @@ zqArraySlot complexBody(const Builtin& self, std::span<Value> arguments) {
     requireCount(arguments, 1, 2);
     const zqArray_tag& real = arguments[0].array();
     const zqClassID cls = host::classOf(real);
-    if (!isNumericClass(cls) || host::isComplex(real))
+    if (!host::isNumericClass(cls) || host::isComplex(real))
         invalid(self, "the real part must be a real numeric array.");
     zqArraySlot imaginary;
     if (arguments.size() == 2) {
         const zqArray_tag& given = arguments[1].array();
-        if (!isNumericClass(host::classOf(given)) || host::isComplex(given)) {
+        if (!host::isNumericClass(host::classOf(given)) || host::isComplex(given)) {
             invalid(self, "the imaginary part must be a real numeric array.");
         }
         imaginary = convertArray(given, cls);

@@ -2,9 +2,9 @@
 #include "calc/conversion.hpp"
 
 #include "calc/array_building.hpp"
-#include "calc/class_tags.hpp"
 #include "calc/errors.hpp"
 #include "calc/text_join.hpp"
+#include "host/element_types.hpp"
 
 #include <limits>
 #include <span>
@@ -73,7 +73,7 @@ zqArraySlot convertArray(const zqArray_tag& source, zqClassID cls) {
 }
 
 zqArraySlot integerLimit(zqClassID cls, bool largest) {
-    return visitClass<IntegerClasses>(
+    return host::visitElementClass<host::IntegerElements>(
         cls,
         [&]<class Tag>(Tag) {
             using T = typename Tag::type;

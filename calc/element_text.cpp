@@ -2,10 +2,10 @@
 #include "calc/element_text.hpp"
 
 #include "calc/array_access.hpp"
-#include "calc/class_tags.hpp"
 #include "calc/number_text.hpp"
-#include "calc/unicode_text.hpp"
 #include "calc/text_join.hpp"
+#include "calc/unicode_text.hpp"
+#include "host/element_types.hpp"
 
 #include <cmath>
 #include <cstdint>
@@ -51,7 +51,7 @@ std::string complexText(T real, T imaginary, NumberStyle style) {
 }  // namespace
 
 std::string numberText(const zqArray_tag& array, std::size_t index, NumberStyle style) {
-    return visitClass<Append<NumericClasses, LogicalTag>::type>(
+    return host::visitElementClass<host::ValueElements>(
         host::classOf(array),
         [&]<class Tag>(Tag) {
             using T = typename Tag::type;

@@ -9,6 +9,7 @@
 #include "calc/errors.hpp"
 #include "calc/parser.hpp"
 #include "calc/text_join.hpp"
+#include "host/element_types.hpp"
 
 #include <algorithm>
 #include <string>
@@ -289,7 +290,7 @@ Value Evaluator::evaluateRange(const RangeExpr& range) {
     for (const Value* operand : {&first, step ? &*step : nullptr, &last}) {
         if (!operand) continue;
         const zqClassID operandClass = host::classOf(operand->array());
-        if (isIntegerClass(operandClass)) {
+        if (host::isIntegerClass(operandClass)) {
             cls = operandClass;
             break;
         }

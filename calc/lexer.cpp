@@ -1,8 +1,8 @@
 // The lexer of bitcalc.
 #include "calc/lexer.hpp"
 
-#include "calc/unicode_text.hpp"
 #include "calc/text_join.hpp"
+#include "calc/unicode_text.hpp"
 
 #include <cstdlib>
 #include <string>

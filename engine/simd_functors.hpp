@@ -31,7 +31,8 @@ inline __m128i shiftCountRegister(std::uint32_t count) noexcept {
 
 // Each lane of T shifted right logically; 8-bit lanes go through 16-bit lanes,
 // zero-extended, and are packed back without saturating.
-template <class T> __m128i logicalRightShift(__m128i v, __m128i count, __m128i zero) noexcept {
+template <class T>
+__m128i logicalRightShift(__m128i v, __m128i count, __m128i zero) noexcept {
     if constexpr (sizeof(T) == 1) {
         const __m128i low = _mm_srl_epi16(_mm_unpacklo_epi8(v, zero), count);
         const __m128i high = _mm_srl_epi16(_mm_unpackhi_epi8(v, zero), count);
@@ -46,7 +47,8 @@ template <class T> __m128i logicalRightShift(__m128i v, __m128i count, __m128i z
 }
 
 // All ones in each lane of T that is zero, for 8, 16 and 32-bit lanes.
-template <class T> __m128i laneIsZero(__m128i v, __m128i zero) noexcept {
+template <class T>
+__m128i laneIsZero(__m128i v, __m128i zero) noexcept {
     if constexpr (sizeof(T) == 1) {
         return _mm_cmpeq_epi8(v, zero);
     } else if constexpr (sizeof(T) == 2) {
@@ -62,26 +64,30 @@ template <class T> __m128i laneIsZero(__m128i v, __m128i zero) noexcept {
 namespace mu {
 
 // in1 AND in2.
-template <class T> struct IntBitandSSE2Ftor {
+template <class T>
+struct IntBitandSSE2Ftor {
     template <class U>
     requires std::is_same_v<U, T>
     auto prepare() const noexcept {
         return [](__m128i a, __m128i b) noexcept { return _mm_and_si128(a, b); };
     }
 };
-template <class T> struct IntBitandFtor {
+template <class T>
+struct IntBitandFtor {
     T operator()(T a, T b) const noexcept { return static_cast<T>(a & b); }
 };
 
 // in1 OR in2.
-template <class T> struct IntBitorSSE2Ftor {
+template <class T>
+struct IntBitorSSE2Ftor {
     template <class U>
     requires std::is_same_v<U, T>
     auto prepare() const noexcept {
         return [](__m128i a, __m128i b) noexcept { return _mm_or_si128(a, b); };
     }
 };
-template <class T> struct IntBitorFtor {
+template <class T>
+struct IntBitorFtor {
     T operator()(T a, T b) const noexcept { return static_cast<T>(a | b); }
 };
 
@@ -95,7 +101,8 @@ class IntBitsetSSE2Ftor {
 public:
     explicit IntBitsetSSE2Ftor(std::uint32_t bitIndex) noexcept : bitIndex_(bitIndex) {}
 
-    template <class T> auto prepare() const noexcept {
+    template <class T>
+    auto prepare() const noexcept {
         static_assert(sizeof(T) <= 4, "no vector bitset for 64-bit elements");
         // The mask, computed in 32 bits and repeated into every lane.
         __m128i mask = _mm_cvtsi32_si128(static_cast<int>(1u << bitIndex_));
@@ -117,7 +124,8 @@ private:
 };
 // a with bit `bitIndex` set if v is not zero (in W's own type), cleared if it
 // is. W is T in the vector pair; bitset also uses it with other value types.
-template <class T, class W> class IntBitsetFtor {
+template <class T, class W>
+class IntBitsetFtor {
 public:
     explicit IntBitsetFtor(std::uint32_t bitIndex) noexcept : bitIndex_(bitIndex) {}
 
@@ -137,7 +145,8 @@ class IntLeftShiftSSE2Ftor {
 public:
     explicit IntLeftShiftSSE2Ftor(std::uint32_t count) noexcept : count_(count) {}
 
-    template <class T> auto prepare() const noexcept {
+    template <class T>
+    auto prepare() const noexcept {
         if constexpr (sizeof(T) == 1) {
             // Through 16-bit lanes: the extra 8 pushes the bits that leave the
             // element out of the lane, the shift right by 8 brings it back.
@@ -167,7 +176,8 @@ public:
 private:
     std::uint32_t count_;
 };
-template <class T> class IntLeftShiftFtor {
+template <class T>
+class IntLeftShiftFtor {
 public:
     explicit IntLeftShiftFtor(std::uint32_t count) noexcept : count_(count) {}
 
@@ -186,7 +196,8 @@ class IntRightShiftSSE2Ftor {
 public:
     explicit IntRightShiftSSE2Ftor(std::uint32_t count) noexcept : count_(count) {}
 
-    template <class T> auto prepare() const noexcept {
+    template <class T>
+    auto prepare() const noexcept {
         static_assert(!(std::is_signed_v<T> && sizeof(T) == 8),
                       "no vector arithmetic shift of 64-bit elements");
         const __m128i count = shiftCountRegister(count_);
@@ -211,7 +222,8 @@ public:
 private:
     std::uint32_t count_;
 };
-template <class T> class IntRightShiftFtor {
+template <class T>
+class IntRightShiftFtor {
 public:
     explicit IntRightShiftFtor(std::uint32_t count) noexcept : count_(count) {}
 
@@ -230,7 +242,8 @@ class IntRightShiftAndSSE2Ftor {
 public:
     explicit IntRightShiftAndSSE2Ftor(std::uint32_t count) noexcept : count_(count) {}
 
-    template <class T> auto prepare() const noexcept {
+    template <class T>
+    auto prepare() const noexcept {
         const __m128i count = shiftCountRegister(count_);
         const __m128i zero = _mm_setzero_si128();
         return [count, zero](__m128i in1, __m128i in2) noexcept {
@@ -241,7 +254,8 @@ public:
 private:
     std::uint32_t count_;
 };
-template <class T> class IntRightShiftAndFtor {
+template <class T>
+class IntRightShiftAndFtor {
 public:
     explicit IntRightShiftAndFtor(std::uint32_t count) noexcept : count_(count) {}
 

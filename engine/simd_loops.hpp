@@ -16,7 +16,8 @@
 namespace bitfcns {
 
 // Elements of T in one 16-byte register.
-template <class T> inline constexpr unsigned long lanesOf = 16 / sizeof(T);
+template <class T>
+inline constexpr unsigned long lanesOf = 16 / sizeof(T);
 
 namespace simd_detail {
 
@@ -60,7 +61,8 @@ template <class T, class ScalarFtor>
 }
 
 // An input read straight from memory, one aligned register per step.
-template <class T> class StreamedInput {
+template <class T>
+class StreamedInput {
 public:
     explicit StreamedInput(const T* p) noexcept : p_(p) {}
     __m128i next() noexcept {
@@ -77,7 +79,8 @@ private:
 // A broadcast input (stride 0): an aligned buffer of L copies of its one
 // element, filled and loaded once before the body; the register stays
 // loop-invariant.
-template <class T> class BroadcastInput {
+template <class T>
+class BroadcastInput {
 public:
     explicit BroadcastInput(const T* p) noexcept {
         alignas(16) T buffer[lanesOf<T>];

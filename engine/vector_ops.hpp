@@ -21,7 +21,8 @@ namespace bitfcns {
 using VectorRange = tbb::blocked_range<unsigned long>;
 
 // out[i] = ftor(in[i * stride]).
-template <class In, class Ftor> struct bitfcnsOneInputVectorOp {
+template <class In, class Ftor>
+struct bitfcnsOneInputVectorOp {
     const In* in;
     In* out;
     unsigned long stride;
@@ -37,7 +38,8 @@ template <class In, class Ftor> struct bitfcnsOneInputVectorOp {
 };
 
 // out[i] = ftor(in1[i * stride1], in2[i * stride2]).
-template <class In1, class In2, class Ftor> struct bitfcnsTwoInputVectorOp {
+template <class In1, class In2, class Ftor>
+struct bitfcnsTwoInputVectorOp {
     const In1* in1;
     const In2* in2;
     In1* out;
@@ -56,7 +58,8 @@ template <class In1, class In2, class Ftor> struct bitfcnsTwoInputVectorOp {
 };
 
 // out[i] = ftor(in1[i * stride1], in2[i * stride2], in3[i * stride3]).
-template <class In1, class In2, class In3, class Ftor> struct bitfcnsThreeInputVectorOp {
+template <class In1, class In2, class In3, class Ftor>
+struct bitfcnsThreeInputVectorOp {
     const In1* in1;
     const In2* in2;
     const In3* in3;
@@ -79,7 +82,8 @@ template <class In1, class In2, class In3, class Ftor> struct bitfcnsThreeInputV
 
 // out[i] = scalarFtor(in[i * stride]), in registers by unarySIMDApply; each
 // subrange does its own alignment peel and tail.
-template <class T, class SimdFtor, class ScalarFtor> struct bitfcnsUnarySIMDVectorOp {
+template <class T, class SimdFtor, class ScalarFtor>
+struct bitfcnsUnarySIMDVectorOp {
     const T* in;
     T* out;
     unsigned long stride;
@@ -95,7 +99,8 @@ template <class T, class SimdFtor, class ScalarFtor> struct bitfcnsUnarySIMDVect
 
 // out[i] = scalarFtor(in1[i * stride1], in2[i * stride2]), in registers by
 // binarySIMDApply; each subrange does its own alignment peel and tail.
-template <class T, class SimdFtor, class ScalarFtor> struct bitfcnsBinarySIMDVectorOp {
+template <class T, class SimdFtor, class ScalarFtor>
+struct bitfcnsBinarySIMDVectorOp {
     const T* in1;
     const T* in2;
     T* out;
@@ -117,7 +122,8 @@ template <class T, class SimdFtor, class ScalarFtor> struct bitfcnsBinarySIMDVec
 // tbb::parallel_for with the record as body, copied by value into its tasks,
 // and the splitting left to the auto partitioner. Throws only what the
 // scheduler throws when it can't create its root task.
-template <class VectorOp> void runVectorOp(const VectorOp& op, unsigned long limit) {
+template <class VectorOp>
+void runVectorOp(const VectorOp& op, unsigned long limit) {
     static_assert(std::is_trivially_copyable_v<VectorOp>, "a record is copied into tasks by value");
     const VectorRange whole(0, op.n);
     if (op.n < limit) {

@@ -46,7 +46,8 @@ constexpr std::array<char16_t, 128> asciiLowerCase = [] {
 }();
 
 char16_t foldCase(char16_t unit) {
-    if ((unit & 0xFF80) != 0) foundation::ustring::detail::throw_ctype_invalid_character_exception();
+    if ((unit & 0xFF80) != 0)
+        foundation::ustring::detail::throw_ctype_invalid_character_exception();
     return asciiLowerCase[unit];
 }
 
@@ -92,8 +93,9 @@ TextView getScalarText(const zqArray_tag* operand, bool rowOnly) {
 
 bool equalsBounded(TextView text, TextView reference, std::size_t bound) {
     if (text.length == 0) return false;
-    const std::uint64_t compareLength = std::max(std::min<std::uint64_t>(text.length, reference.length),
-                                                 std::min<std::uint64_t>(reference.length, bound));
+    const std::uint64_t compareLength =
+        std::max(std::min<std::uint64_t>(text.length, reference.length),
+                 std::min<std::uint64_t>(reference.length, bound));
     if (reference.data == nullptr || compareLength == 0 || text.data == nullptr) return false;
 
     if (text.length <= compareLength) {

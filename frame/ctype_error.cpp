@@ -12,7 +12,8 @@ CtypeExceptionBase::CtypeExceptionBase(std::string text, std::int32_t kind)
 
 const char* CtypeExceptionBase::what() const noexcept { return text_.c_str(); }
 
-CtypeInvalidCharacter::CtypeInvalidCharacter() : CtypeExceptionBase("Invalid character error.", 3) {}
+CtypeInvalidCharacter::CtypeInvalidCharacter()
+    : CtypeExceptionBase("Invalid character error.", 3) {}
 
 void detail::throw_ctype_invalid_character_exception() {
     throw boost::exception_detail::clone_impl<CtypeInvalidCharacter>(CtypeInvalidCharacter());

@@ -54,14 +54,10 @@ inline __m128i repeatElement(const void* element, std::size_t elementBytes) {
     std::uint64_t value = 0;
     std::memcpy(&value, element, elementBytes);
     switch (elementBytes) {
-        case 1:
-            return _mm_set1_epi8(static_cast<char>(value));
-        case 2:
-            return _mm_set1_epi16(static_cast<short>(value));
-        case 4:
-            return _mm_set1_epi32(static_cast<int>(value));
-        default:
-            return _mm_set1_epi64x(static_cast<long long>(value));
+        case 1: return _mm_set1_epi8(static_cast<char>(value));
+        case 2: return _mm_set1_epi16(static_cast<short>(value));
+        case 4: return _mm_set1_epi32(static_cast<int>(value));
+        default: return _mm_set1_epi64x(static_cast<long long>(value));
     }
 }
 

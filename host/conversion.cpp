@@ -94,13 +94,19 @@ void convertElements(const From* in, To* out, std::size_t count) {
 
 // Converts `count` elements of class `from` at `in` to class `to` at `out`.
 void convertStorage(zqClassID from, const void* in, zqClassID to, void* out, std::size_t count) {
-    visitElementClass(StoredElements{}, from, [&](auto fromTag) {
-        using From = typename decltype(fromTag)::type;
-        visitElementClass(StoredElements{}, to, [&](auto toTag) {
-            using To = typename decltype(toTag)::type;
-            convertElements(static_cast<const From*>(in), static_cast<To*>(out), count);
-        });
-    });
+    visitElementClass<StoredElements>(
+        from,
+        [&](auto fromTag) {
+            using From = typename decltype(fromTag)::type;
+            visitElementClass<StoredElements>(
+                to,
+                [&](auto toTag) {
+                    using To = typename decltype(toTag)::type;
+                    convertElements(static_cast<const From*>(in), static_cast<To*>(out), count);
+                },
+                [] {});
+        },
+        [] {});
 }
 
 }  // namespace

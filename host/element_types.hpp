@@ -1,11 +1,14 @@
 // The host's element types by class: one tag per class that holds elements,
 // the type lists of its families, and the one switch from a class id to a
-// tag, written as a visitor. Private to the host.
+// tag, written as a visitor. Used by the host and by its tools.
 #pragma once
 
 #include "host/zq_array.hpp"
 
 #include <cstddef>
+#include <optional>
+#include <type_traits>
+#include <utility>
 
 namespace host {
 
@@ -34,16 +37,44 @@ struct TagList {};
 // The eight integer classes in class-id order.
 using IntegerElements = TagList<Int8Element, UInt8Element, Int16Element, UInt16Element,
                                 Int32Element, UInt32Element, Int64Element, UInt64Element>;
+// The numeric classes: the integers, single and double.
+using NumericElements =
+    TagList<Int8Element, UInt8Element, Int16Element, UInt16Element, Int32Element, UInt32Element,
+            Int64Element, UInt64Element, SingleElement, DoubleElement>;
+// The numeric classes and logical.
+using ValueElements =
+    TagList<Int8Element, UInt8Element, Int16Element, UInt16Element, Int32Element, UInt32Element,
+            Int64Element, UInt64Element, SingleElement, DoubleElement, LogicalElement>;
 // Every class that holds elements: what conversion reads and writes.
 using StoredElements =
     TagList<Int8Element, UInt8Element, Int16Element, UInt16Element, Int32Element, UInt32Element,
             Int64Element, UInt64Element, SingleElement, DoubleElement, LogicalElement, CharElement>;
 
-// Calls `visitor(Tag{})` for the tag of `List` whose id is `id`; returns false
-// when no tag of the list has that id.
-template <class... Tags, class Visitor>
-bool visitElementClass(TagList<Tags...>, zqClassID id, Visitor&& visitor) {
-    return ((id == Tags::id ? (visitor(Tags{}), true) : false) || ...);
+template <class Tag>
+inline constexpr bool isIntegerElement = Tag::id >= zqInt8Class&& Tag::id <= zqUInt64Class;
+
+namespace detail {
+template <class... Tags, class Visitor, class Otherwise>
+decltype(auto) visitElementClassIn(TagList<Tags...>, zqClassID id, Visitor& visitor,
+                                   Otherwise& otherwise) {
+    using Result = decltype(otherwise());
+    if constexpr (std::is_void_v<Result>) {
+        const bool found = ((id == Tags::id ? (visitor(Tags{}), true) : false) || ...);
+        if (!found) otherwise();
+    } else {
+        std::optional<Result> result;
+        ((id == Tags::id ? (result.emplace(visitor(Tags{})), true) : false) || ...);
+        return result ? Result(std::move(*result)) : otherwise();
+    }
+}
+}  // namespace detail
+
+// The switch from a class id to a tag: calls `visitor(Tag{})` for the tag of
+// `List` whose id is `id` and returns its result, or `otherwise()` when no
+// tag of the list has that id. All calls must return the same type.
+template <class List, class Visitor, class Otherwise>
+decltype(auto) visitElementClass(zqClassID id, Visitor&& visitor, Otherwise&& otherwise) {
+    return detail::visitElementClassIn(List{}, id, visitor, otherwise);
 }
 
 // Element size in bytes for each stored class; 0 for any other class.

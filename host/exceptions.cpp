@@ -12,7 +12,9 @@
 namespace resource_core {
 
 BaseMsgID::BaseMsgID(std::string groupName, std::string leafName, std::size_t argumentCount)
-    : arguments(argumentCount, Argument(0L)), group(std::move(groupName)), leaf(std::move(leafName)) {}
+    : arguments(argumentCount, Argument(0L)),
+      group(std::move(groupName)),
+      leaf(std::move(leafName)) {}
 
 }  // namespace resource_core
 

@@ -4,12 +4,12 @@
 // on one; the innermost group gives contiguous runs, combined byte-wise
 // (bitwise_kernels.hpp), and the outer groups are walked like an odometer.
 // The same range body serves the serial path and the parallel one.
+#include "host/math_utils.hpp"
 #include "host/array_body.hpp"
 #include "host/bitwise_kernels.hpp"
 #include "host/element_conversion.hpp"
 #include "host/element_types.hpp"
 #include "host/exceptions.hpp"
-#include "host/math_utils.hpp"
 
 #include <tbb/blocked_range.h>
 #include <tbb/parallel_for.h>
@@ -178,12 +178,15 @@ bool isScalar(const zqArray_tag& array) { return trueElementCount(array) == 1; }
 // false when it is no whole number that the class holds.
 bool integerElementOf(double value, zqClassID cls, std::byte* element) {
     bool held = false;
-    visitElementClass(IntegerElements{}, cls, [&](auto tag) {
-        using T = typename decltype(tag)::type;
-        T converted{};
-        held = doubleHoldsInteger(value, converted);
-        std::memcpy(element, &converted, sizeof converted);
-    });
+    visitElementClass<IntegerElements>(
+        cls,
+        [&](auto tag) {
+            using T = typename decltype(tag)::type;
+            T converted{};
+            held = doubleHoldsInteger(value, converted);
+            std::memcpy(element, &converted, sizeof converted);
+        },
+        [] {});
     return held;
 }
 

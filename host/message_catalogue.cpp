@@ -38,8 +38,8 @@ struct LogicFunction {
     std::string_view group;
     std::string_view name;
 };
-constexpr std::array<LogicFunction, 3> logicFunctions{{
-    {"VESPRA:Bitand", "bitand"}, {"VESPRA:Bitor", "bitor"}, {"VESPRA:bitxor", "bitxor"}}};
+constexpr std::array<LogicFunction, 3> logicFunctions{
+    {{"VESPRA:Bitand", "bitand"}, {"VESPRA:Bitor", "bitor"}, {"VESPRA:bitxor", "bitxor"}}};
 
 constexpr auto fixedEntries = std::to_array<CatalogueEntry>({
     // The host's own errors.
@@ -83,7 +83,8 @@ constexpr auto fixedEntries = std::to_array<CatalogueEntry>({
     {"VESPRA:bitset:numericArg",
      "Inputs to bitset must be numeric; the new bit values may also be logical."},
     {"VESPRA:bitset:complexArgs", "Inputs to bitset must be real."},
-    {"VESPRA:bitset:invalidV", "The new bit values of bitset must be numeric or logical, and not single."},
+    {"VESPRA:bitset:invalidV",
+     "The new bit values of bitset must be numeric or logical, and not single."},
     {"VESPRA:bitset:sizeMismatch",
      "Inputs to bitset must have the same size, unless they are scalars."},
     {"VESPRA:bitset:unknownTypeString",
@@ -122,14 +123,16 @@ public:
         entries_.assign(fixedEntries.begin(), fixedEntries.end());
         for (const LogicFunction& function : logicFunctions) {
             for (const CatalogueEntry& leaf : logicLeaves) {
-                std::string identifier = std::string(function.group) + ':' + std::string(leaf.identifier);
+                std::string identifier =
+                    std::string(function.group) + ':' + std::string(leaf.identifier);
                 std::string sentence(leaf.sentence);
                 sentence.replace(sentence.find('%'), 1, function.name);
                 texts_.push_back(std::move(identifier));
                 texts_.push_back(std::move(sentence));
             }
         }
-        for (std::size_t i = 0; i < texts_.size(); i += 2) entries_.push_back({texts_[i], texts_[i + 1]});
+        for (std::size_t i = 0; i < texts_.size(); i += 2)
+            entries_.push_back({texts_[i], texts_[i + 1]});
     }
 
     std::span<const CatalogueEntry> entries() const { return entries_; }
@@ -150,8 +153,9 @@ std::span<const CatalogueEntry> catalogue() { return theCatalogue().entries(); }
 
 std::string_view catalogueSentence(std::string_view identifier) {
     const auto entries = catalogue();
-    const auto found = std::find_if(entries.begin(), entries.end(),
-                                    [&](const CatalogueEntry& e) { return e.identifier == identifier; });
+    const auto found = std::find_if(entries.begin(), entries.end(), [&](const CatalogueEntry& e) {
+        return e.identifier == identifier;
+    });
     return found == entries.end() ? std::string_view() : found->sentence;
 }
 

@@ -14,10 +14,8 @@ bool isScalarText(const zqArray_tag* array, bool, bool admitStringScalars) {
     switch (host::trueClassOf(*array)) {
         case zqCharClass:
             return dims.count == 2 && (dims[0] == 1 || (dims[0] == 0 && dims[1] == 0));
-        case zqStringClass:
-            return admitStringScalars && host::trueElementCount(*array) == 1;
-        default:
-            return false;
+        case zqStringClass: return admitStringScalars && host::trueElementCount(*array) == 1;
+        default: return false;
     }
 }
 

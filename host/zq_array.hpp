@@ -53,8 +53,8 @@ struct zqArray_tag {
     union {
         unsigned long sizes2[2];  // with zqTwoDimensionalFlag: rows, columns
         struct {
-            unsigned long* dims;   // otherwise: the sizes
-            unsigned long ndims;   // and their count
+            unsigned long* dims;  // otherwise: the sizes
+            unsigned long ndims;  // and their count
         } sizesN;
     };
     void* data;  // the real elements

@@ -40,7 +40,8 @@ bool sizesExpand(const zqArray_tag* first, const zqArray_tag* second) {
     const unsigned long* firstSizes = dimensionsOf(first);
     const unsigned long* secondSizes = dimensionsOf(second);
     for (unsigned long i = 0; i < common; ++i) {
-        if (firstSizes[i] != 1 && secondSizes[i] != 1 && firstSizes[i] != secondSizes[i]) return false;
+        if (firstSizes[i] != 1 && secondSizes[i] != 1 && firstSizes[i] != secondSizes[i])
+            return false;
     }
     return true;
 }
@@ -55,7 +56,8 @@ public:
     // is written last, so a refused call leaves it as it was.
     void run(zqArraySlot* plhs) {
         if (isSparse(first_) || isSparse(second_)) fail<"sparseArgs">();
-        if (!isNumericOrLogical(first_) || !isNumericOrLogical(second_)) fail<"operandsNotNumeric">();
+        if (!isNumericOrLogical(first_) || !isNumericOrLogical(second_))
+            fail<"operandsNotNumeric">();
         if (isComplex(first_) || isComplex(second_)) fail<"complexInputs">();
         const Kind firstKind = kindOf(first_);
         const Kind secondKind = kindOf(second_);
@@ -132,8 +134,8 @@ private:
         return zqArraySlot(matrix::convert_if_needed(result.get(), zqDoubleClass).detach());
     }
 
-    static boost::intrusive_ptr<zqArray_tag> validatedConversion(const zqArray_tag* operand, Kind kind,
-                                                                  zqClassID workClass) {
+    static boost::intrusive_ptr<zqArray_tag> validatedConversion(const zqArray_tag* operand,
+                                                                 Kind kind, zqClassID workClass) {
         if (kind == Kind::real64 && !fitsIntegerClass(operand, workClass)) fail<"outOfRange">();
         return matrix::convert_if_needed(operand, workClass);
     }

@@ -27,12 +27,11 @@ CallOutcome bitcmp(std::vector<const zqArray_tag*> inputs, int nlhs = 1) {
     return callEntry(&ondelBitCmpFcn, std::move(inputs), nlhs);
 }
 
-zqArraySlot text(std::u16string_view value) {
-    return host::makeCharArray(value);
-}
+zqArraySlot text(std::u16string_view value) { return host::makeCharArray(value); }
 
 // The name of T's class, as an assumed-type operand spells it.
-template <class T> std::u16string_view classNameOf() {
+template <class T>
+std::u16string_view classNameOf() {
     constexpr std::u16string_view names[] = {u"int8",  u"uint8",  u"int16", u"uint16",
                                              u"int32", u"uint32", u"int64", u"uint64"};
     return names[classIdOf<T> - zqInt8Class];
@@ -45,7 +44,8 @@ zqArraySlot flaggedForSharing(zqArraySlot array) {
 
 // Integer operands: the complement in their own class, sizes kept, the
 // class's own name accepted as second operand, and in place when flagged.
-template <class T> class IntegerOperand : public ::testing::Test {};
+template <class T>
+class IntegerOperand : public ::testing::Test {};
 using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
                                       unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(IntegerOperand, IntegerTypes);
@@ -184,7 +184,8 @@ zqArraySlot sparse(zqArraySlot array) {
     return array;
 }
 
-template <class T> zqArraySlot complexOf(T value) {
+template <class T>
+zqArraySlot complexOf(T value) {
     auto array = scalarOf(value);
     const T imaginary = T(1);
     host::makeComplex(*array, std::as_bytes(std::span<const T>(&imaginary, 1)));

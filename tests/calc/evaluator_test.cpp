@@ -1,9 +1,9 @@
 // The evaluator against fake entry points: the calling shape (nlhs, the
 // 0x200 flag on temporaries only), results and refusals, the human display,
 // no array left behind, and random statements evaluated.
+#include "calc/evaluator.hpp"
 #include "calc/array_access.hpp"
 #include "calc/display.hpp"
-#include "calc/evaluator.hpp"
 #include "calc/text_join.hpp"
 #include "host/array_factory.hpp"
 #include "host/exceptions.hpp"

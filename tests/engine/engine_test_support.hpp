@@ -28,11 +28,13 @@ using RightShiftIntegers = ::testing::Types<signed char, unsigned char, short, u
 using BitsetIntegers =
     ::testing::Types<signed char, unsigned char, short, unsigned short, int, unsigned int>;
 
-template <class T> inline constexpr std::uint32_t bitsOf = sizeof(T) * 8;
+template <class T>
+inline constexpr std::uint32_t bitsOf = sizeof(T) * 8;
 
 // A 16-byte aligned block of `size` elements, every byte first set to a
 // sentinel so that writes outside the expected part can be found.
-template <class T> class AlignedBuffer {
+template <class T>
+class AlignedBuffer {
 public:
     static constexpr unsigned char sentinel = 0xA5;
 
@@ -68,7 +70,8 @@ private:
 };
 
 // `count` values of T: the extremes, 0, 1 and -1 first, then random ones.
-template <class T> std::vector<T> testValues(std::size_t count, std::uint32_t seed) {
+template <class T>
+std::vector<T> testValues(std::size_t count, std::uint32_t seed) {
     std::vector<T> values{std::numeric_limits<T>::min(),
                           std::numeric_limits<T>::max(),
                           T(0),
@@ -83,7 +86,8 @@ template <class T> std::vector<T> testValues(std::size_t count, std::uint32_t se
 }
 
 // New bit values: zero about half the time, otherwise any non-zero value.
-template <class T> std::vector<T> newBitValues(std::size_t count, std::uint32_t seed) {
+template <class T>
+std::vector<T> newBitValues(std::size_t count, std::uint32_t seed) {
     std::vector<T> values = testValues<T>(count, seed);
     std::mt19937 random(seed + 1);
     for (T& v : values)
@@ -91,7 +95,8 @@ template <class T> std::vector<T> newBitValues(std::size_t count, std::uint32_t 
     return values;
 }
 
-template <class T> std::uint64_t bitPattern(T x) {
+template <class T>
+std::uint64_t bitPattern(T x) {
     return static_cast<std::uint64_t>(static_cast<std::make_unsigned_t<T>>(x));
 }
 
@@ -99,58 +104,104 @@ template <class T> std::uint64_t bitPattern(T x) {
 // count or bit index), a plain scalar reference, and the second operand the
 // pair is used with.
 struct BitandPair {
-    template <class T> static auto vector(std::uint32_t) { return mu::IntBitandSSE2Ftor<T>{}; }
-    template <class T> static auto scalar(std::uint32_t) { return mu::IntBitandFtor<T>{}; }
-    template <class T> static T expected(T a, T b, std::uint32_t) {
+    template <class T>
+    static auto vector(std::uint32_t) {
+        return mu::IntBitandSSE2Ftor<T>{};
+    }
+    template <class T>
+    static auto scalar(std::uint32_t) {
+        return mu::IntBitandFtor<T>{};
+    }
+    template <class T>
+    static T expected(T a, T b, std::uint32_t) {
         return T(bitPattern(a) & bitPattern(b));
     }
-    template <class T> static std::vector<T> secondValues(std::size_t n) {
+    template <class T>
+    static std::vector<T> secondValues(std::size_t n) {
         return testValues<T>(n, 2);
     }
 };
 struct BitorPair {
-    template <class T> static auto vector(std::uint32_t) { return mu::IntBitorSSE2Ftor<T>{}; }
-    template <class T> static auto scalar(std::uint32_t) { return mu::IntBitorFtor<T>{}; }
-    template <class T> static T expected(T a, T b, std::uint32_t) {
+    template <class T>
+    static auto vector(std::uint32_t) {
+        return mu::IntBitorSSE2Ftor<T>{};
+    }
+    template <class T>
+    static auto scalar(std::uint32_t) {
+        return mu::IntBitorFtor<T>{};
+    }
+    template <class T>
+    static T expected(T a, T b, std::uint32_t) {
         return T(bitPattern(a) | bitPattern(b));
     }
-    template <class T> static std::vector<T> secondValues(std::size_t n) {
+    template <class T>
+    static std::vector<T> secondValues(std::size_t n) {
         return testValues<T>(n, 2);
     }
 };
 struct BitsetPair {
-    template <class T> static auto vector(std::uint32_t p) { return IntBitsetSSE2Ftor(p); }
-    template <class T> static auto scalar(std::uint32_t p) { return IntBitsetFtor<T, T>(p); }
-    template <class T> static T expected(T a, T v, std::uint32_t index) {
+    template <class T>
+    static auto vector(std::uint32_t p) {
+        return IntBitsetSSE2Ftor(p);
+    }
+    template <class T>
+    static auto scalar(std::uint32_t p) {
+        return IntBitsetFtor<T, T>(p);
+    }
+    template <class T>
+    static T expected(T a, T v, std::uint32_t index) {
         const std::uint64_t mask = std::uint64_t{1} << index;
         return T(v != 0 ? bitPattern(a) | mask : bitPattern(a) & ~mask);
     }
-    template <class T> static std::vector<T> secondValues(std::size_t n) {
+    template <class T>
+    static std::vector<T> secondValues(std::size_t n) {
         return newBitValues<T>(n, 2);
     }
 };
 // Used with a second operand of 1 only, the one use for which the twins agree.
 struct RightShiftAndPair {
-    template <class T> static auto vector(std::uint32_t p) { return IntRightShiftAndSSE2Ftor(p); }
-    template <class T> static auto scalar(std::uint32_t p) { return IntRightShiftAndFtor<T>(p); }
-    template <class T> static T expected(T a, T b, std::uint32_t count) {
+    template <class T>
+    static auto vector(std::uint32_t p) {
+        return IntRightShiftAndSSE2Ftor(p);
+    }
+    template <class T>
+    static auto scalar(std::uint32_t p) {
+        return IntRightShiftAndFtor<T>(p);
+    }
+    template <class T>
+    static T expected(T a, T b, std::uint32_t count) {
         return T((bitPattern(a) >> count) & bitPattern(b));
     }
-    template <class T> static std::vector<T> secondValues(std::size_t n) {
+    template <class T>
+    static std::vector<T> secondValues(std::size_t n) {
         return std::vector<T>(n, T(1));
     }
 };
 struct LeftShiftPair {
-    template <class T> static auto vector(std::uint32_t p) { return IntLeftShiftSSE2Ftor(p); }
-    template <class T> static auto scalar(std::uint32_t p) { return IntLeftShiftFtor<T>(p); }
-    template <class T> static T expected(T a, std::uint32_t count) {
+    template <class T>
+    static auto vector(std::uint32_t p) {
+        return IntLeftShiftSSE2Ftor(p);
+    }
+    template <class T>
+    static auto scalar(std::uint32_t p) {
+        return IntLeftShiftFtor<T>(p);
+    }
+    template <class T>
+    static T expected(T a, std::uint32_t count) {
         return T(bitPattern(a) << count);
     }
 };
 struct RightShiftPair {
-    template <class T> static auto vector(std::uint32_t p) { return IntRightShiftSSE2Ftor(p); }
-    template <class T> static auto scalar(std::uint32_t p) { return IntRightShiftFtor<T>(p); }
-    template <class T> static T expected(T a, std::uint32_t count) {
+    template <class T>
+    static auto vector(std::uint32_t p) {
+        return IntRightShiftSSE2Ftor(p);
+    }
+    template <class T>
+    static auto scalar(std::uint32_t p) {
+        return IntRightShiftFtor<T>(p);
+    }
+    template <class T>
+    static T expected(T a, std::uint32_t count) {
         if constexpr (std::is_signed_v<T>)
             return T(static_cast<std::int64_t>(a) >> count);
         else

@@ -15,7 +15,8 @@ namespace {
 constexpr unsigned long inputStrides[] = {0, 1, 2};
 
 // Element offsets within a register to try for an input of this stride.
-template <class T> std::size_t offsetsFor(unsigned long stride) {
+template <class T>
+std::size_t offsetsFor(unsigned long stride) {
     return stride == 1 ? lanesOf<T> : 1;
 }
 
@@ -38,7 +39,8 @@ std::string layout(std::size_t n, std::size_t outOffset, std::size_t offset1, un
            " parameter=" + std::to_string(parameter) + (inPlace ? " in place" : "");
 }
 
-template <class Pair, class T> void sweepBinary() {
+template <class Pair, class T>
+void sweepBinary() {
     constexpr std::size_t lanes = lanesOf<T>;
     constexpr std::size_t longest = 3 * lanes + 1;
     constexpr std::size_t room = 2 * longest + lanes;
@@ -76,7 +78,8 @@ template <class Pair, class T> void sweepBinary() {
                             }
 }
 
-template <class Pair, class T> void sweepUnary() {
+template <class Pair, class T>
+void sweepUnary() {
     constexpr std::size_t lanes = lanesOf<T>;
     constexpr std::size_t longest = 3 * lanes + 1;
     constexpr std::size_t room = 2 * longest + lanes;
@@ -106,35 +109,26 @@ template <class Pair, class T> void sweepUnary() {
                     }
 }
 
-template <class T> class EveryWidthPairs : public ::testing::Test {};
+template <class T>
+class EveryWidthPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryWidthPairs, AllIntegers);
 
-TYPED_TEST(EveryWidthPairs, Bitand) {
-    sweepBinary<BitandPair, TypeParam>();
-}
-TYPED_TEST(EveryWidthPairs, Bitor) {
-    sweepBinary<BitorPair, TypeParam>();
-}
-TYPED_TEST(EveryWidthPairs, RightShiftAnd) {
-    sweepBinary<RightShiftAndPair, TypeParam>();
-}
-TYPED_TEST(EveryWidthPairs, LeftShift) {
-    sweepUnary<LeftShiftPair, TypeParam>();
-}
+TYPED_TEST(EveryWidthPairs, Bitand) { sweepBinary<BitandPair, TypeParam>(); }
+TYPED_TEST(EveryWidthPairs, Bitor) { sweepBinary<BitorPair, TypeParam>(); }
+TYPED_TEST(EveryWidthPairs, RightShiftAnd) { sweepBinary<RightShiftAndPair, TypeParam>(); }
+TYPED_TEST(EveryWidthPairs, LeftShift) { sweepUnary<LeftShiftPair, TypeParam>(); }
 
-template <class T> class RightShiftPairs : public ::testing::Test {};
+template <class T>
+class RightShiftPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(RightShiftPairs, RightShiftIntegers);
 
-TYPED_TEST(RightShiftPairs, RightShift) {
-    sweepUnary<RightShiftPair, TypeParam>();
-}
+TYPED_TEST(RightShiftPairs, RightShift) { sweepUnary<RightShiftPair, TypeParam>(); }
 
-template <class T> class BitsetPairs : public ::testing::Test {};
+template <class T>
+class BitsetPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(BitsetPairs, BitsetIntegers);
 
-TYPED_TEST(BitsetPairs, Bitset) {
-    sweepBinary<BitsetPair, TypeParam>();
-}
+TYPED_TEST(BitsetPairs, Bitset) { sweepBinary<BitsetPair, TypeParam>(); }
 
 // The twin of bitset also serves value types other than T: a value is true
 // when it isn't zero in its own type.

@@ -26,7 +26,8 @@ struct CallLog {
 };
 
 // A record that logs each subrange before handing it to the real one.
-template <class VectorOp> struct Logged {
+template <class VectorOp>
+struct Logged {
     VectorOp op;
     unsigned long n;
     CallLog* log;
@@ -61,38 +62,62 @@ enum class Layout { unary, dataThenConstant, constantThenData, dataThenValues };
 struct SetOneBit {
     using Pair = BitorPair;
     static constexpr Layout layout = Layout::constantThenData;
-    template <class T> static constexpr unsigned long limit = limits::setOneBit<T>;
-    template <class T> static T constant(std::uint32_t p) { return T(std::uint64_t{1} << p); }
+    template <class T>
+    static constexpr unsigned long limit = limits::setOneBit<T>;
+    template <class T>
+    static T constant(std::uint32_t p) {
+        return T(std::uint64_t{1} << p);
+    }
 };
 struct ClearOneBit {
     using Pair = BitandPair;
     static constexpr Layout layout = Layout::constantThenData;
-    template <class T> static constexpr unsigned long limit = limits::clearOneBit<T>;
-    template <class T> static T constant(std::uint32_t p) { return T(~(std::uint64_t{1} << p)); }
+    template <class T>
+    static constexpr unsigned long limit = limits::clearOneBit<T>;
+    template <class T>
+    static T constant(std::uint32_t p) {
+        return T(~(std::uint64_t{1} << p));
+    }
 };
 struct GetOneBit {
     using Pair = RightShiftAndPair;
     static constexpr Layout layout = Layout::dataThenConstant;
-    template <class T> static constexpr unsigned long limit = limits::getOneBit<T>;
-    template <class T> static T constant(std::uint32_t) { return T(1); }
+    template <class T>
+    static constexpr unsigned long limit = limits::getOneBit<T>;
+    template <class T>
+    static T constant(std::uint32_t) {
+        return T(1);
+    }
 };
 struct SetBitFromValues {
     using Pair = BitsetPair;
     static constexpr Layout layout = Layout::dataThenValues;
-    template <class T> static constexpr unsigned long limit = limits::setBitFromValues<T>;
-    template <class T> static T constant(std::uint32_t) { return T(0); }
+    template <class T>
+    static constexpr unsigned long limit = limits::setBitFromValues<T>;
+    template <class T>
+    static T constant(std::uint32_t) {
+        return T(0);
+    }
 };
 struct LeftShift {
     using Pair = LeftShiftPair;
     static constexpr Layout layout = Layout::unary;
-    template <class T> static constexpr unsigned long limit = limits::leftShift<T>;
-    template <class T> static T constant(std::uint32_t) { return T(0); }
+    template <class T>
+    static constexpr unsigned long limit = limits::leftShift<T>;
+    template <class T>
+    static T constant(std::uint32_t) {
+        return T(0);
+    }
 };
 struct RightShift {
     using Pair = RightShiftPair;
     static constexpr Layout layout = Layout::unary;
-    template <class T> static constexpr unsigned long limit = limits::rightShift<T>;
-    template <class T> static T constant(std::uint32_t) { return T(0); }
+    template <class T>
+    static constexpr unsigned long limit = limits::rightShift<T>;
+    template <class T>
+    static T constant(std::uint32_t) {
+        return T(0);
+    }
 };
 
 // The record of a family, filled as its callers fill it; `second` is the
@@ -115,7 +140,8 @@ auto familyRecord(T* out, const T* data, const T* second, unsigned long n, std::
     }
 }
 
-template <class Family, class T> T expectedElement(T a, T value, T constant, std::uint32_t p) {
+template <class Family, class T>
+T expectedElement(T a, T value, T constant, std::uint32_t p) {
     using Pair = typename Family::Pair;
     if constexpr (Family::layout == Layout::unary)
         return Pair::expected(a, p);
@@ -159,7 +185,8 @@ void checkFamilyRun(const std::vector<T>& data, const std::vector<T>& values, un
     }
 }
 
-template <class Family, class T> void checkFamilyAtLimit() {
+template <class Family, class T>
+void checkFamilyAtLimit() {
     const unsigned long limit = Family::template limit<T>;
     const std::vector<T> data = testValues<T>(limit, 5);
     const std::vector<T> values = newBitValues<T>(limit, 6);
@@ -174,35 +201,26 @@ template <class Family, class T> void checkFamilyAtLimit() {
     }
 }
 
-template <class T> class EveryWidthFamilies : public ::testing::Test {};
+template <class T>
+class EveryWidthFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryWidthFamilies, AllIntegers);
 
-TYPED_TEST(EveryWidthFamilies, SetOneBit) {
-    checkFamilyAtLimit<SetOneBit, TypeParam>();
-}
-TYPED_TEST(EveryWidthFamilies, ClearOneBit) {
-    checkFamilyAtLimit<ClearOneBit, TypeParam>();
-}
-TYPED_TEST(EveryWidthFamilies, GetOneBit) {
-    checkFamilyAtLimit<GetOneBit, TypeParam>();
-}
-TYPED_TEST(EveryWidthFamilies, LeftShift) {
-    checkFamilyAtLimit<LeftShift, TypeParam>();
-}
+TYPED_TEST(EveryWidthFamilies, SetOneBit) { checkFamilyAtLimit<SetOneBit, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, ClearOneBit) { checkFamilyAtLimit<ClearOneBit, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, GetOneBit) { checkFamilyAtLimit<GetOneBit, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, LeftShift) { checkFamilyAtLimit<LeftShift, TypeParam>(); }
 
-template <class T> class RightShiftFamilies : public ::testing::Test {};
+template <class T>
+class RightShiftFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(RightShiftFamilies, RightShiftIntegers);
 
-TYPED_TEST(RightShiftFamilies, RightShift) {
-    checkFamilyAtLimit<RightShift, TypeParam>();
-}
+TYPED_TEST(RightShiftFamilies, RightShift) { checkFamilyAtLimit<RightShift, TypeParam>(); }
 
-template <class T> class BitsetFamilies : public ::testing::Test {};
+template <class T>
+class BitsetFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(BitsetFamilies, BitsetIntegers);
 
-TYPED_TEST(BitsetFamilies, SetBitFromValues) {
-    checkFamilyAtLimit<SetBitFromValues, TypeParam>();
-}
+TYPED_TEST(BitsetFamilies, SetBitFromValues) { checkFamilyAtLimit<SetBitFromValues, TypeParam>(); }
 
 // Plain records: the same elements serially and when split down to single
 // elements (limit 1), with every input broadcast or not.

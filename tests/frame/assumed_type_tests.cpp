@@ -25,9 +25,10 @@ TEST(EqualsBounded, NullTextsNeverMatchAndNonAsciiRaisesOnlyWhereCompared) {
     EXPECT_FALSE(equalsBounded({nullptr, 4}, view(u"int8"), 4));
     EXPECT_THROW(equalsBounded(view(u"\u00e9nt8"), view(u"int8"), 4), InvalidCharacter);
     EXPECT_THROW(equalsBounded(view(u"int1\u00e9"), view(u"int16"), 4), InvalidCharacter);
-    EXPECT_FALSE(equalsBounded(view(u"int8\u00e9"), view(u"int8"), 4));   // past the compare length
-    EXPECT_FALSE(equalsBounded(view(u"uint\u00e9"), view(u"int8"), 4));   // differs before it
-    EXPECT_THROW(equalsBounded(view(u"\u0100"), view(u"int8"), 4), InvalidCharacter);  // high byte only
+    EXPECT_FALSE(equalsBounded(view(u"int8\u00e9"), view(u"int8"), 4));  // past the compare length
+    EXPECT_FALSE(equalsBounded(view(u"uint\u00e9"), view(u"int8"), 4));  // differs before it
+    EXPECT_THROW(equalsBounded(view(u"\u0100"), view(u"int8"), 4),
+                 InvalidCharacter);  // high byte only
 }
 
 // The same text as a char row and as a string scalar.
@@ -59,7 +60,8 @@ TEST(ParseAssumedType, SpellingsCutFormsCaseAndLength) {
     for (const SpellingCase& c : cases) {
         for (const zqArraySlot& operand : asCharRowAndString(c.text)) {
             EXPECT_EQ(parseAssumedType(operand.get()), c.expected)
-                << std::string(c.text.begin(), c.text.end()) << " class " << host::classOf(*operand);
+                << std::string(c.text.begin(), c.text.end()) << " class "
+                << host::classOf(*operand);
         }
     }
 }
@@ -82,7 +84,8 @@ TEST(ParseAssumedType, WhatIsNoScalarTextHasNoClass) {
     std::vector<zqArraySlot> cellElements;
     cellElements.push_back(host::makeCharArray(u"int8"));
     operands.push_back(host::makeCellArray({1, 1}, std::move(cellElements)));
-    for (const zqArraySlot& operand : operands) EXPECT_EQ(parseAssumedType(operand.get()), zqNoClass);
+    for (const zqArraySlot& operand : operands)
+        EXPECT_EQ(parseAssumedType(operand.get()), zqNoClass);
 }
 
 TEST(ParseAssumedType, CharRowWithIncompleteSizesOrOpaqueClass) {
@@ -109,7 +112,8 @@ TEST(GetScalarText, RefusesWhatIsNoLineOfText) {
     EXPECT_THROW(getScalarText(nullptr, true), NotText);
     EXPECT_THROW(getScalarText(host::makeCharArray({2, 2}, u"int8").get(), true), NotText);
     EXPECT_THROW(getScalarText(host::makeStringArray({1, 2}, {u"a", u"b"}).get(), true), NotText);
-    EXPECT_THROW(getScalarText(host::makeStringArray({1, 1, 2}, {u"a", u"b"}).get(), true), NotText);
+    EXPECT_THROW(getScalarText(host::makeStringArray({1, 1, 2}, {u"a", u"b"}).get(), true),
+                 NotText);
     EXPECT_THROW(getScalarText(host::makeDoubleScalar(1).get(), true), NotText);
     EXPECT_EQ(host::legacyErrorCount(), 0u);
 }

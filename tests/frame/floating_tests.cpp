@@ -36,10 +36,20 @@ void expectFloorAgrees(F x, F floored) {
 }
 
 TEST(FloorDouble, AgreesWithFloorAtTheEdges) {
-    std::vector<double> values{0.0, 0.5, 1.5, 2.5, 255.5, 2147483647.5, 1e-310, nan, inf,
-                               largestFiniteDouble, std::nextafter(1.0, 0.0)};
+    std::vector<double> values{0.0,
+                               0.5,
+                               1.5,
+                               2.5,
+                               255.5,
+                               2147483647.5,
+                               1e-310,
+                               nan,
+                               inf,
+                               largestFiniteDouble,
+                               std::nextafter(1.0, 0.0)};
     for (double around : {two31, two52, two53, two63, two64}) {
-        for (double offset : {-1.5, -1.0, -0.5, 0.0, 0.5, 1.0, 1.5}) values.push_back(around + offset);
+        for (double offset : {-1.5, -1.0, -0.5, 0.0, 0.5, 1.0, 1.5})
+            values.push_back(around + offset);
         values.push_back(std::nextafter(around, 0.0));
         values.push_back(std::nextafter(around, inf));
     }
@@ -64,8 +74,9 @@ TEST(FloorDouble, AgreesWithFloorOnRandomBitsAndRandomMagnitudes) {
 }
 
 TEST(FloorSingle, AgreesWithFloor) {
-    for (float x : {0.0f, 0.5f, 2.5f, 8388609.0f, 8388607.5f, 16777216.0f, 1e-40f,
-                    std::numeric_limits<float>::infinity(), std::numeric_limits<float>::quiet_NaN()}) {
+    for (float x :
+         {0.0f, 0.5f, 2.5f, 8388609.0f, 8388607.5f, 16777216.0f, 1e-40f,
+          std::numeric_limits<float>::infinity(), std::numeric_limits<float>::quiet_NaN()}) {
         expectFloorAgrees(x, floorSingle(x));
         expectFloorAgrees(-x, floorSingle(-x));
     }
@@ -105,7 +116,8 @@ TYPED_TEST(ElementTestByClass, AcceptsExactlyTheWholeNumbersOfTheClass) {
     const double aboveHighest = highest + 1 != highest ? highest + 1 : std::nextafter(highest, inf);
     EXPECT_FALSE(fitsInteger<T>(belowLowest));
     EXPECT_FALSE(fitsInteger<T>(aboveHighest));
-    for (double bad : {nan, inf, -inf, 0.5, -0.5, 255.5, 2147483647.5}) EXPECT_FALSE(fitsInteger<T>(bad)) << bad;
+    for (double bad : {nan, inf, -inf, 0.5, -0.5, 255.5, 2147483647.5})
+        EXPECT_FALSE(fitsInteger<T>(bad)) << bad;
 
     const std::vector<double> good{lowest, 0.0, highest};
     std::vector<double> badLast = good;

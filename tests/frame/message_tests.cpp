@@ -6,9 +6,9 @@
 #include "host/host_control.hpp"
 #include "host/message_catalogue.hpp"
 
+#include <gtest/gtest.h>
 #include <boost/exception/get_error_info.hpp>
 #include <boost/exception/info.hpp>
-#include <gtest/gtest.h>
 
 #include <functional>
 #include <memory>
@@ -37,9 +37,7 @@ Identifier identifier(std::string literal) {
                 EXPECT_TRUE(tag.arguments.empty());
                 return tag.group + ':' + tag.leaf;
             },
-            [] {
-                raiseError<Tag>();
-            }};
+            [] { raiseError<Tag>(); }};
 }
 
 const std::vector<Identifier>& allIdentifiers() {
@@ -120,8 +118,10 @@ std::string groupOf(std::string_view identifier) {
 }
 
 // Generic code names a tag by group and leaf and gets the same class.
-static_assert(std::is_same_v<MessageTag<"VESPRA:bitxor", "sizeMismatch">, VESPRA::bitxor::sizeMismatch>);
-static_assert(std::is_same_v<MessageTag<VESPRA::Bitor::group, "outOfRange">, VESPRA::Bitor::outOfRange>);
+static_assert(
+    std::is_same_v<MessageTag<"VESPRA:bitxor", "sizeMismatch">, VESPRA::bitxor::sizeMismatch>);
+static_assert(
+    std::is_same_v<MessageTag<VESPRA::Bitor::group, "outOfRange">, VESPRA::Bitor::outOfRange>);
 static_assert(!std::is_same_v<VESPRA::Bitand::sparseArgs, VESPRA::bitxor::sparseArgs>);
 
 TEST(Identifiers, EachIsItsOwnTagSpelledExactly) {
@@ -217,7 +217,8 @@ TEST(IdentifiedException, CopiesAndClonesOutliveTheOriginal) {
 TEST(InvalidCharacter, IsThrownWrappedAndReadsAsItsText) {
     try {
         foundation::ustring::detail::throw_ctype_invalid_character_exception();
-    } catch (const boost::exception_detail::clone_impl<foundation::ustring::CtypeInvalidCharacter>& error) {
+    } catch (const boost::exception_detail::clone_impl<foundation::ustring::CtypeInvalidCharacter>&
+                 error) {
         EXPECT_STREQ(error.what(), "Invalid character error.");
         EXPECT_EQ(error.kind(), 3);
         return;

@@ -129,18 +129,10 @@ TYPED_TEST(ConversionToInteger, MatchesRoundingReferenceOnBothPaths) {
     // the serial and the parallel body run.
     while (values.size() < 70000) {
         switch (values.size() / 8 % 4) {
-            case 0:
-                values.push_back(std::trunc(spread(random)));
-                break;
-            case 1:
-                values.push_back(spread(random));
-                break;
-            case 2:
-                values.push_back(std::trunc(spread(random)) + 0.5);
-                break;
-            default:
-                values.push_back(std::trunc(small(random)));
-                break;
+            case 0: values.push_back(std::trunc(spread(random))); break;
+            case 1: values.push_back(spread(random)); break;
+            case 2: values.push_back(std::trunc(spread(random)) + 0.5); break;
+            default: values.push_back(std::trunc(small(random))); break;
         }
     }
     zqArraySlot source = arrayOf(zqDoubleClass, {values.size(), 1}, values);

@@ -138,7 +138,8 @@ TYPED_TEST(BitLogicTest, IntegerPathComputesInTheIntegerClass) {
     const std::vector<unsigned long> got = elementsOf<unsigned long>(arrays.result.get());
     const std::vector<unsigned long> left = elementsOf<unsigned long>(a.get());
     const std::vector<unsigned long> right = elementsOf<unsigned long>(b.get());
-    for (std::size_t i = 0; i < got.size(); ++i) EXPECT_EQ(got[i], TypeParam::apply(left[i], right[i]));
+    for (std::size_t i = 0; i < got.size(); ++i)
+        EXPECT_EQ(got[i], TypeParam::apply(left[i], right[i]));
 
     // A double scalar partner, on either side, is taken in the integer class.
     const auto values = makeOf<signed char>({-1, 5, -128});
@@ -151,8 +152,8 @@ TYPED_TEST(BitLogicTest, IntegerPathComputesInTheIntegerClass) {
         const auto out = elementsOf<signed char>(outcome.result.get());
         const signed char expected[] = {-1, 5, -128};
         for (std::size_t i = 0; i < 3; ++i) {
-            EXPECT_EQ(out[i], static_cast<signed char>(TypeParam::apply(
-                                  static_cast<unsigned char>(expected[i]), 3)));
+            EXPECT_EQ(out[i], static_cast<signed char>(
+                                  TypeParam::apply(static_cast<unsigned char>(expected[i]), 3)));
         }
     }
 }
@@ -208,9 +209,12 @@ TYPED_TEST(BitLogicTest, TwoFaultsYieldTheEarlierTest) {
     EXPECT_EQ(this->refusal({single3.get(), double2.get()}), this->id("firstArgsNotInt"));
     EXPECT_EQ(this->refusal({u8x3.get(), i8x2.get()}), this->id("sizeMismatch"));
     EXPECT_EQ(this->refusal({u8x2.get(), i8x2.get(), badName.get()}), this->id("mixedClasses"));
-    EXPECT_EQ(this->refusal({single3.get(), double2.get(), badName.get()}), this->id("firstArgsNotInt"));
-    EXPECT_EQ(this->refusal({minusOne.get(), double2.get(), badName.get()}), this->id("unknownTypeString"));
-    EXPECT_EQ(this->refusal({u8x2.get(), big.get(), int8Name.get()}), this->id("invalidTypeString"));
+    EXPECT_EQ(this->refusal({single3.get(), double2.get(), badName.get()}),
+              this->id("firstArgsNotInt"));
+    EXPECT_EQ(this->refusal({minusOne.get(), double2.get(), badName.get()}),
+              this->id("unknownTypeString"));
+    EXPECT_EQ(this->refusal({u8x2.get(), big.get(), int8Name.get()}),
+              this->id("invalidTypeString"));
 }
 
 TYPED_TEST(BitLogicTest, SizesExpandWhereOneOfThemIsOne) {
@@ -218,8 +222,8 @@ TYPED_TEST(BitLogicTest, SizesExpandWhereOneOfThemIsOne) {
         host::Dims first, second, result;
     };
     const std::vector<SizeRow> passing = {
-        {{2, 3}, {2, 1}, {2, 3}},       {{2, 1}, {1, 3}, {2, 3}},   {{2, 3, 4}, {2, 3}, {2, 3, 4}},
-        {{0, 3}, {1, 3}, {0, 3}},       {{1, 1, 5}, {4, 1}, {4, 1, 5}}, {{2, 3}, {1, 1}, {2, 3}},
+        {{2, 3}, {2, 1}, {2, 3}}, {{2, 1}, {1, 3}, {2, 3}},       {{2, 3, 4}, {2, 3}, {2, 3, 4}},
+        {{0, 3}, {1, 3}, {0, 3}}, {{1, 1, 5}, {4, 1}, {4, 1, 5}}, {{2, 3}, {1, 1}, {2, 3}},
     };
     for (const SizeRow& row : passing) {
         const auto a = host::makeArray(zqUInt8Class, row.first);
@@ -253,8 +257,8 @@ TYPED_TEST(BitLogicTest, DoublesAreIntegersOfTheWorkingClass) {
     };
     check(300, 1, nullptr, expect(300, 1));
     check(255, 1, u"uint8", expect(255, 1));
-    check(-1, -128, u"int8", static_cast<double>(static_cast<signed char>(
-                                  TypeParam::apply(0xFFul, 0x80ul))));
+    check(-1, -128, u"int8",
+          static_cast<double>(static_cast<signed char>(TypeParam::apply(0xFFul, 0x80ul))));
     // Far apart in size, the pattern of bitor and bitxor can need more than
     // 53 bits; the conversion back to double rounds it.
     check(9223372036854775808.0, 1, nullptr, expect(1ul << 63, 1));
@@ -262,12 +266,18 @@ TYPED_TEST(BitLogicTest, DoublesAreIntegersOfTheWorkingClass) {
     check(9007199254740992.0, 1, nullptr, expect(9007199254740992ul, 1));
 
     for (const auto& [a, b, type] : std::vector<std::tuple<double, double, const char16_t*>>{
-             {-1, 1, nullptr}, {1.5, 1, nullptr}, {nan, 1, nullptr}, {1, inf, nullptr},
-             {18446744073709551616.0, 1, nullptr}, {300, 1, u"uint8"}, {1, -129, u"int8"}}) {
+             {-1, 1, nullptr},
+             {1.5, 1, nullptr},
+             {nan, 1, nullptr},
+             {1, inf, nullptr},
+             {18446744073709551616.0, 1, nullptr},
+             {300, 1, u"uint8"},
+             {1, -129, u"int8"}}) {
         const auto x = scalarOf<double>(a);
         const auto y = scalarOf<double>(b);
         const auto name = type ? host::makeCharArray(type) : host::makeCharArray(u"uint64");
-        EXPECT_EQ(this->refusal({x.get(), y.get(), name.get()}), this->id("outOfRange")) << a << ", " << b;
+        EXPECT_EQ(this->refusal({x.get(), y.get(), name.get()}), this->id("outOfRange"))
+            << a << ", " << b;
     }
 }
 
@@ -296,7 +306,8 @@ TYPED_TEST(BitLogicTest, FailuresLeaveTheSlotAndReleaseConversions) {
     const auto logical = makeOf<bool>({true, false});
     const auto bad = makeOf<double>({1, -1});
     const auto good = makeOf<double>({1, 2});
-    const auto failing = [&](std::vector<const zqArray_tag*> inputs, std::size_t successes, bool raises) {
+    const auto failing = [&](std::vector<const zqArray_tag*> inputs, std::size_t successes,
+                             bool raises) {
         host::setLegacyErrorRaises(raises);
         zqArraySlot slot(host::makeDoubleScalar(42).release());
         const zqArray_tag* before = slot.get();

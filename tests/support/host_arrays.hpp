@@ -16,18 +16,30 @@
 namespace testing_support {
 
 // The host class of an element type.
-template <class T> inline constexpr zqClassID classIdOf = zqNoClass;
-template <> inline constexpr zqClassID classIdOf<signed char> = zqInt8Class;
-template <> inline constexpr zqClassID classIdOf<unsigned char> = zqUInt8Class;
-template <> inline constexpr zqClassID classIdOf<short> = zqInt16Class;
-template <> inline constexpr zqClassID classIdOf<unsigned short> = zqUInt16Class;
-template <> inline constexpr zqClassID classIdOf<int> = zqInt32Class;
-template <> inline constexpr zqClassID classIdOf<unsigned int> = zqUInt32Class;
-template <> inline constexpr zqClassID classIdOf<long> = zqInt64Class;
-template <> inline constexpr zqClassID classIdOf<unsigned long> = zqUInt64Class;
-template <> inline constexpr zqClassID classIdOf<float> = zqSingleClass;
-template <> inline constexpr zqClassID classIdOf<double> = zqDoubleClass;
-template <> inline constexpr zqClassID classIdOf<bool> = zqLogicalClass;
+template <class T>
+inline constexpr zqClassID classIdOf = zqNoClass;
+template <>
+inline constexpr zqClassID classIdOf<signed char> = zqInt8Class;
+template <>
+inline constexpr zqClassID classIdOf<unsigned char> = zqUInt8Class;
+template <>
+inline constexpr zqClassID classIdOf<short> = zqInt16Class;
+template <>
+inline constexpr zqClassID classIdOf<unsigned short> = zqUInt16Class;
+template <>
+inline constexpr zqClassID classIdOf<int> = zqInt32Class;
+template <>
+inline constexpr zqClassID classIdOf<unsigned int> = zqUInt32Class;
+template <>
+inline constexpr zqClassID classIdOf<long> = zqInt64Class;
+template <>
+inline constexpr zqClassID classIdOf<unsigned long> = zqUInt64Class;
+template <>
+inline constexpr zqClassID classIdOf<float> = zqSingleClass;
+template <>
+inline constexpr zqClassID classIdOf<double> = zqDoubleClass;
+template <>
+inline constexpr zqClassID classIdOf<bool> = zqLogicalClass;
 
 // An array of T's class holding `values`; a row unless `dims` is given.
 template <class T>
@@ -68,7 +80,8 @@ struct CallOutcome {
     std::string error;
 };
 
-inline CallOutcome callEntry(EntryPoint entry, std::vector<const zqArray_tag*> inputs, int nlhs = 1) {
+inline CallOutcome callEntry(EntryPoint entry, std::vector<const zqArray_tag*> inputs,
+                             int nlhs = 1) {
     CallOutcome outcome;
     try {
         entry(nlhs, &outcome.result, static_cast<int>(inputs.size()), inputs.data());
