@@ -66,59 +66,6 @@ benchmark::internal::Benchmark* registerCounts(const std::string& name,
     return bench;
 }
 
-template <>
-zqClassID classIdOf<signed char>() {
-    return zqInt8Class;
-}
-template <>
-zqClassID classIdOf<unsigned char>() {
-    return zqUInt8Class;
-}
-template <>
-zqClassID classIdOf<short>() {
-    return zqInt16Class;
-}
-template <>
-zqClassID classIdOf<unsigned short>() {
-    return zqUInt16Class;
-}
-template <>
-zqClassID classIdOf<int>() {
-    return zqInt32Class;
-}
-template <>
-zqClassID classIdOf<unsigned int>() {
-    return zqUInt32Class;
-}
-template <>
-zqClassID classIdOf<long>() {
-    return zqInt64Class;
-}
-template <>
-zqClassID classIdOf<unsigned long>() {
-    return zqUInt64Class;
-}
-template <>
-zqClassID classIdOf<double>() {
-    return zqDoubleClass;
-}
-
-template <class T>
-const char* className() {
-    constexpr const char* names[] = {"double", "single", "int8",   "uint8", "int16",
-                                     "uint16", "int32",  "uint32", "int64", "uint64"};
-    return names[classIdOf<T>() - zqDoubleClass];
-}
-template const char* className<signed char>();
-template const char* className<unsigned char>();
-template const char* className<short>();
-template const char* className<unsigned short>();
-template const char* className<int>();
-template const char* className<unsigned int>();
-template const char* className<long>();
-template const char* className<unsigned long>();
-template const char* className<double>();
-
 zqArraySlot hostResult(zqClassID cls, unsigned long n) {
     const unsigned long dims[] = {1, n};
     zqArraySlot result(matrix::detail::create_uninitnumeric(2, dims, cls, zqReal, 0, nullptr));

@@ -13,6 +13,7 @@
 // every parallel run.
 #pragma once
 
+#include "host/element_types.hpp"
 #include "host/zq_array.hpp"
 
 #include <benchmark/benchmark.h>
@@ -44,9 +45,15 @@ benchmark::internal::Benchmark* registerCounts(const std::string& name,
 
 // The host class of an element type, and its name: "uint8", "double".
 template <class T>
-zqClassID classIdOf();
+zqClassID classIdOf() {
+    return host::elementClassOf<T>;
+}
 template <class T>
-const char* className();
+const char* className() {
+    constexpr const char* names[] = {"double", "single", "int8",   "uint8", "int16",
+                                     "uint16", "int32",  "uint32", "int64", "uint64"};
+    return names[classIdOf<T>() - zqDoubleClass];
+}
 
 // A new host array of n elements of class `cls` in one row, with undefined
 // contents, made the way a result is made.

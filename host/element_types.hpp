@@ -50,6 +50,19 @@ using StoredElements =
     TagList<Int8Element, UInt8Element, Int16Element, UInt16Element, Int32Element, UInt32Element,
             Int64Element, UInt64Element, SingleElement, DoubleElement, LogicalElement, CharElement>;
 
+namespace detail {
+template <class T, class... Tags>
+constexpr zqClassID classOfElementIn(TagList<Tags...>) {
+    zqClassID id = zqNoClass;
+    ((std::is_same_v<T, typename Tags::type> ? (id = Tags::id, true) : false) || ...);
+    return id;
+}
+}  // namespace detail
+
+// The class whose elements are of type T; zqNoClass for any other type.
+template <class T>
+inline constexpr zqClassID elementClassOf = detail::classOfElementIn<T>(StoredElements{});
+
 template <class Tag>
 inline constexpr bool isIntegerElement = Tag::id >= zqInt8Class&& Tag::id <= zqUInt64Class;
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "host/array_factory.hpp"
+#include "host/element_types.hpp"
 #include "host/exceptions.hpp"
 #include "host/zq_array.hpp"
 
@@ -17,29 +18,7 @@ namespace testing_support {
 
 // The host class of an element type.
 template <class T>
-inline constexpr zqClassID classIdOf = zqNoClass;
-template <>
-inline constexpr zqClassID classIdOf<signed char> = zqInt8Class;
-template <>
-inline constexpr zqClassID classIdOf<unsigned char> = zqUInt8Class;
-template <>
-inline constexpr zqClassID classIdOf<short> = zqInt16Class;
-template <>
-inline constexpr zqClassID classIdOf<unsigned short> = zqUInt16Class;
-template <>
-inline constexpr zqClassID classIdOf<int> = zqInt32Class;
-template <>
-inline constexpr zqClassID classIdOf<unsigned int> = zqUInt32Class;
-template <>
-inline constexpr zqClassID classIdOf<long> = zqInt64Class;
-template <>
-inline constexpr zqClassID classIdOf<unsigned long> = zqUInt64Class;
-template <>
-inline constexpr zqClassID classIdOf<float> = zqSingleClass;
-template <>
-inline constexpr zqClassID classIdOf<double> = zqDoubleClass;
-template <>
-inline constexpr zqClassID classIdOf<bool> = zqLogicalClass;
+inline constexpr zqClassID classIdOf = host::elementClassOf<T>;
 
 // An array of T's class holding `values`; a row unless `dims` is given.
 template <class T>
