@@ -3,6 +3,8 @@
 // class.
 #pragma once
 
+#include "engine/parallel_limits.hpp"
+
 #include <cstdint>
 #include <type_traits>
 
@@ -32,6 +34,8 @@ inline double unsigned64ToDouble(std::uint64_t v) noexcept {
 // T. With the 64-bit classes the complement is rounded to the nearest double.
 template <class T>
 struct BitcmpFtor {
+    static constexpr unsigned long parallelLimit = limits::bitcmpOnDouble;
+
     double operator()(double x) const noexcept {
         if constexpr (sizeof(T) < 4 || std::is_same_v<T, int>) {
             return static_cast<double>(static_cast<T>(~static_cast<std::int32_t>(x)));
