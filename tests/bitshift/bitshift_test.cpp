@@ -1,0 +1,285 @@
+// bitshift through its entry point: the shift rule as one table, through a
+// scalar count and an array of counts of every class that holds the count,
+// fresh and in place; random values against a reference model one below and
+// at each parallel limit; refused calls that write nothing; allocation
+// failures that leave nothing behind. The order of refusals is in the
+// golden case file.
+#include "bitfcns/entry_points.hpp"
+#include "engine/parallel_limits.hpp"
+#include "host/array_factory.hpp"
+#include "host/host_control.hpp"
+#include "tests/support/host_arrays.hpp"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <limits>
+#include <new>
+#include <random>
+#include <utility>
+#include <vector>
+
+namespace {
+
+using namespace testing_support;
+
+CallOutcome bitshift(std::vector<const zqArray_tag*> inputs) {
+    return callEntry(&ondelBitShiftFcn, std::move(inputs));
+}
+
+zqArraySlot flagged(zqArraySlot array, bool inPlace = true) {
+    host::setWantsSharedResult(*array, inPlace);
+    return array;
+}
+
+// The shift rule by arithmetic instead of shifts: a left shift multiplies
+// modulo 2^64 and truncates, a right shift divides, rounding down.
+template <class T>
+T referenceShift(T x, long c) {
+    using Bits = std::uint64_t;
+    constexpr long w = sizeof(T) * 8;
+    if (c >= w) return T(0);
+    if (c <= -w) return std::cmp_less(x, 0) ? T(-1) : T(0);
+    if (c >= 0) return static_cast<T>(static_cast<Bits>(x) * (Bits{1} << c));
+    const Bits divisor = Bits{1} << -c;
+    if (std::cmp_less(x, 0)) return static_cast<T>(~(static_cast<Bits>(~x) / divisor));
+    return static_cast<T>(static_cast<Bits>(x) / divisor);
+}
+
+// Rows of the rule. A long double holds every value and count here exactly,
+// 64-bit ones included.
+struct Row {
+    zqClassID cls;
+    long double value, count, expected;
+};
+
+constexpr long double twoTo63 = 9223372036854775808.0L;
+
+const Row rows[] = {
+    {zqUInt8Class, 255, 1, 254},
+    {zqUInt8Class, 255, -1, 127},
+    {zqUInt8Class, 255, 7, 128},
+    {zqUInt8Class, 255, 8, 0},
+    {zqUInt8Class, 255, -7, 1},
+    {zqUInt8Class, 255, -8, 0},
+    {zqUInt8Class, 5, -0.0L, 5},
+    {zqUInt8Class, 1, -twoTo63, 0},
+    {zqInt8Class, 1, 7, -128},
+    {zqInt8Class, 64, 1, -128},
+    {zqInt8Class, -128, 1, 0},
+    {zqInt8Class, -1, 1, -2},
+    {zqInt8Class, -1, 7, -128},
+    {zqInt8Class, -1, 8, 0},
+    {zqInt8Class, -128, -7, -1},
+    {zqInt8Class, -1, -1, -1},
+    {zqInt8Class, -1, -8, -1},
+    {zqInt8Class, -1, -127, -1},
+    {zqInt8Class, 127, -7, 0},
+    {zqInt8Class, 127, -8, 0},
+    {zqInt8Class, -1, -twoTo63, -1},   // the lowest int64
+    {zqInt8Class, 5, twoTo63 + 1, 0},  // uint64 above 2^63
+    {zqInt16Class, 1, 15, -32768},
+    {zqInt16Class, -32768, -15, -1},
+    {zqInt16Class, -32768, -16, -1},
+    {zqInt16Class, -1, 16, 0},
+    {zqInt16Class, -32768, -0.0L, -32768},
+    {zqUInt16Class, 65535, -15, 1},
+    {zqUInt16Class, 65535, 16, 0},
+    {zqInt32Class, 1, 31, -2147483648.0L},
+    {zqInt32Class, -2147483648.0L, -32, -1},
+    {zqInt32Class, -7, 1e300, 0},  // a double count; no other class holds it
+    {zqInt32Class, -7, -1e300, -1},
+    {zqUInt32Class, 4294967295.0L, 31, 2147483648.0L},
+    {zqUInt32Class, 4294967295.0L, -32, 0},
+    {zqInt64Class, 1, 63, -twoTo63},
+    {zqInt64Class, 1, 64, 0},
+    {zqInt64Class, -1, -63, -1},
+    {zqInt64Class, -1, -64, -1},
+    {zqInt64Class, -twoTo63, -1, -twoTo63 / 2},
+    {zqUInt64Class, 1, 63, twoTo63},
+    {zqUInt64Class, 1, 64, 0},
+    {zqUInt64Class, twoTo63, -63, 1},
+    {zqUInt64Class, 18446744073709551615.0L, 0, 18446744073709551615.0L},
+};
+
+// Whether class U holds the count exactly.
+template <class U>
+bool holds(long double count) {
+    using Limits = std::numeric_limits<U>;
+    if (std::fabs(count) > static_cast<long double>(Limits::max())) return false;
+    if constexpr (Limits::is_integer) return count >= static_cast<long double>(Limits::min());
+    return static_cast<long double>(static_cast<U>(count)) == count;
+}
+
+// n elements: a register body and a tail at every width.
+template <class T, class U>
+void checkRow(const Row& row) {
+    constexpr unsigned long n = 37;
+    const auto values = std::vector<T>(n, static_cast<T>(row.value));
+    const U count = static_cast<U>(row.count);
+    const auto expected = std::vector<T>(n, static_cast<T>(row.expected));
+    for (bool scalarCount : {true, false})
+        for (bool inPlace : {false, true}) {
+            SCOPED_TRACE(testing::Message()
+                         << "count class " << classIdOf<U> << (scalarCount ? ", scalar" : ", array")
+                         << (inPlace ? ", in place" : ""));
+            const auto operand = flagged(makeOf(values), inPlace);
+            const auto counts = scalarCount ? scalarOf(count) : makeOf(std::vector<U>(n, count));
+            const auto outcome = bitshift({operand.get(), counts.get()});
+            ASSERT_EQ(outcome.error, "");
+            EXPECT_EQ(host::classOf(*outcome.result), classIdOf<T>);
+            EXPECT_EQ(elementsOf<T>(outcome.result.get()), expected);
+        }
+}
+
+template <class T, class... Counts>
+void checkRowForEachCountClass(const Row& row, host::TagList<Counts...>) {
+    ((holds<typename Counts::type>(row.count) ? checkRow<T, typename Counts::type>(row) : void()),
+     ...);
+}
+
+TEST(ShiftRule, OneTableThroughBothFormsAndEveryCountClass) {
+    for (const Row& row : rows) {
+        SCOPED_TRACE(testing::Message()
+                     << "class " << row.cls << ", value " << row.value << ", count " << row.count);
+        host::visitElementClass<host::IntegerElements>(
+            row.cls,
+            [&]<class Tag>(Tag) {
+                using T = typename Tag::type;
+                ASSERT_EQ(referenceShift<T>(static_cast<T>(row.value),
+                                            static_cast<long>(std::fmax(
+                                                std::fmin(row.count, 1000.0L), -1000.0L))),
+                          static_cast<T>(row.expected));
+                checkRowForEachCountClass<T>(row, host::NumericElements{});
+            },
+            [] { FAIL() << "no integer class"; });
+    }
+}
+
+// Random values: scalar counts that shift left and right by SIMD (right by
+// a plain serial loop for int64), fill with zeros and with signs, at one
+// below and at the parallel limit of the width; random counts in an array
+// at one below and at its limit.
+template <class T>
+class EveryValueClass : public ::testing::Test {};
+using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                      unsigned int, long, unsigned long>;
+TYPED_TEST_SUITE(EveryValueClass, IntegerTypes);
+
+template <class T, class U>
+void checkAgainstReference(const std::vector<T>& values, const std::vector<U>& counts) {
+    for (bool inPlace : {false, true}) {
+        const auto operand = flagged(makeOf(values), inPlace);
+        const auto countArray = makeOf(counts);
+        const auto outcome = bitshift({operand.get(), countArray.get()});
+        ASSERT_EQ(outcome.error, "");
+        EXPECT_EQ(host::storageIdentity(*outcome.result) == host::storageIdentity(*operand),
+                  inPlace);
+        const auto result = elementsOf<T>(outcome.result.get());
+        for (std::size_t i = 0; i < values.size(); ++i)
+            ASSERT_EQ(result[i], referenceShift(values[i], counts[counts.size() == 1 ? 0 : i]))
+                << "element " << i << " of " << values.size() << (inPlace ? ", in place" : "");
+    }
+}
+
+TYPED_TEST(EveryValueClass, SerialAndParallelRunsFollowTheRule) {
+    using T = TypeParam;
+    constexpr long w = sizeof(T) * 8;
+    std::mt19937_64 random(42);
+    const auto randomValues = [&](unsigned long n) {
+        std::vector<T> values(n);
+        for (T& v : values) v = static_cast<T>(random());
+        return values;
+    };
+    const unsigned long scalarLimit = bitfcns::limits::leftShift<T>;
+    for (unsigned long n : {scalarLimit - 1, scalarLimit}) {
+        const auto values = randomValues(n);
+        for (long c : {3l, -3l, w, -w}) {
+            SCOPED_TRACE(testing::Message() << "scalar count " << c);
+            checkAgainstReference(values, std::vector<double>{static_cast<double>(c)});
+        }
+    }
+    const unsigned long arrayLimit = bitfcns::limits::bitshiftCountArray;
+    for (unsigned long n : {arrayLimit - 1, arrayLimit}) {
+        std::vector<signed char> counts(n);
+        for (auto& c : counts) c = static_cast<signed char>(long(random() % (2 * w + 5)) - w - 2);
+        checkAgainstReference(randomValues(n), counts);
+    }
+}
+
+// Double values: one below and at the limit, fresh and in place, against
+// the rule in int16 with a scalar and an array of counts.
+TEST(DoubleValues, SerialAndParallelRunsFollowTheRule) {
+    const auto int16 = host::makeCharArray(u"int16");
+    for (unsigned long n :
+         {bitfcns::limits::bitshiftOnDouble - 1, bitfcns::limits::bitshiftOnDouble})
+        for (bool inPlace : {false, true}) {
+            std::vector<double> values(n), counts(n);
+            for (unsigned long i = 0; i < n; ++i) {
+                values[i] = static_cast<double>(static_cast<short>(i * 40503));
+                counts[i] = static_cast<double>(long(i % 37) - 18);
+            }
+            const auto countArray = makeOf(counts);
+            const auto scalarCount = scalarOf(-3.0);
+            for (const zqArray_tag* count : {countArray.get(), scalarCount.get()}) {
+                const auto operand = flagged(makeOf(values), inPlace);
+                const auto outcome = bitshift({operand.get(), count, int16.get()});
+                ASSERT_EQ(outcome.error, "");
+                const auto result = elementsOf<double>(outcome.result.get());
+                for (unsigned long i = 0; i < n; ++i) {
+                    const double c = count == scalarCount.get() ? -3.0 : counts[i];
+                    ASSERT_EQ(result[i],
+                              referenceShift(static_cast<short>(values[i]), static_cast<long>(c)))
+                        << i << " of " << n;
+                }
+            }
+        }
+}
+
+// A refused call writes nothing, also into values whose storage it shares:
+// the bad count comes last.
+TEST(Refusals, NothingWrittenInPlace) {
+    const double nan = std::numeric_limits<double>::quiet_NaN();
+    const std::vector<double> doubleValues{1, 2, 3};
+    const std::vector<unsigned char> integerValues{1, 2, 3};
+    for (double bad : {nan, 1.5, std::numeric_limits<double>::infinity()}) {
+        const auto counts = makeOf<double>({1, 1, bad});
+        const auto singleCounts = makeOf<float>({1, 1, static_cast<float>(bad)});
+        const auto doubles = flagged(makeOf(doubleValues));
+        const auto integers = flagged(makeOf(integerValues));
+        for (auto [values, countArray] : {std::pair{doubles.get(), counts.get()},
+                                          {integers.get(), counts.get()},
+                                          {integers.get(), singleCounts.get()}}) {
+            const std::size_t liveBefore = host::liveArrayCount();
+            EXPECT_EQ(bitshift({values, countArray}).error, "VESPRA:bitshift:inputsMustBeIntegers");
+            EXPECT_EQ(host::liveArrayCount(), liveBefore);
+        }
+        EXPECT_EQ(elementsOf<double>(doubles.get()), doubleValues);
+        EXPECT_EQ(elementsOf<unsigned char>(integers.get()), integerValues);
+    }
+}
+
+// An allocation failure at each step (the conversion of integer counts for
+// double values, the result) raises and leaves no array behind.
+TEST(Refusals, AllocationFailureLeavesNothingBehind) {
+    const auto doubleValues = makeOf<double>({1, 2});
+    const auto integerValues = makeOf<short>({1, 2});
+    const auto counts = makeOf<short>({1, 2});
+    for (const zqArray_tag* values : {doubleValues.get(), integerValues.get()}) {
+        std::size_t successes = 0;
+        for (;; ++successes) {
+            const std::size_t liveBefore = host::liveArrayCount();
+            host::failNextAllocations(1, successes);
+            const auto outcome = bitshift({values, counts.get()});
+            host::failNextAllocations(0);
+            if (outcome.error.empty()) break;
+            EXPECT_EQ(outcome.error, foundation::core::except::bad_alloc().what());
+            EXPECT_EQ(outcome.result, nullptr);
+            EXPECT_EQ(host::liveArrayCount(), liveBefore);
+        }
+        EXPECT_GE(successes, values == doubleValues.get() ? 2u : 1u);
+    }
+}
+
+}  // namespace
