@@ -204,27 +204,33 @@ TEST(DoubleValues, SerialAndParallelRunsFollowTheRule) {
         }
 }
 
-// A refused call writes nothing, also into values whose storage it shares:
-// the bad count comes last.
+// A refused call writes nothing, also into values whose storage it shares,
+// wherever the bad count stands among nine.
 TEST(Refusals, NothingWrittenInPlace) {
-    const double nan = std::numeric_limits<double>::quiet_NaN();
-    const std::vector<double> doubleValues{1, 2, 3};
-    const std::vector<unsigned char> integerValues{1, 2, 3};
-    for (double bad : {nan, 1.5, std::numeric_limits<double>::infinity()}) {
-        const auto counts = makeOf<double>({1, 1, bad});
-        const auto singleCounts = makeOf<float>({1, 1, static_cast<float>(bad)});
-        const auto doubles = flagged(makeOf(doubleValues));
-        const auto integers = flagged(makeOf(integerValues));
-        for (auto [values, countArray] : {std::pair{doubles.get(), counts.get()},
-                                          {integers.get(), counts.get()},
-                                          {integers.get(), singleCounts.get()}}) {
-            const std::size_t liveBefore = host::liveArrayCount();
-            EXPECT_EQ(bitshift({values, countArray}).error, "VESPRA:bitshift:inputsMustBeIntegers");
-            EXPECT_EQ(host::liveArrayCount(), liveBefore);
+    const std::vector<double> doubleValues(9, 1.0);
+    const std::vector<unsigned char> integerValues(9, 1);
+    for (double bad : {std::numeric_limits<double>::quiet_NaN(), 1.5, -0.5,
+                       -std::numeric_limits<double>::infinity(), -8388607.5})
+        for (std::size_t at : {0, 3, 5, 8}) {
+            SCOPED_TRACE(testing::Message() << bad << " at " << at);
+            std::vector<double> counts(9, 2.0);
+            counts[at] = bad;
+            std::vector<float> singleCounts(counts.begin(), counts.end());
+            const auto doubles = flagged(makeOf(doubleValues));
+            const auto integers = flagged(makeOf(integerValues));
+            const auto doubleCounts = makeOf(counts);
+            const auto floatCounts = makeOf(singleCounts);
+            for (auto [values, countArray] : {std::pair{doubles.get(), doubleCounts.get()},
+                                              {integers.get(), doubleCounts.get()},
+                                              {integers.get(), floatCounts.get()}}) {
+                const std::size_t liveBefore = host::liveArrayCount();
+                EXPECT_EQ(bitshift({values, countArray}).error,
+                          "VESPRA:bitshift:inputsMustBeIntegers");
+                EXPECT_EQ(host::liveArrayCount(), liveBefore);
+            }
+            EXPECT_EQ(elementsOf<double>(doubles.get()), doubleValues);
+            EXPECT_EQ(elementsOf<unsigned char>(integers.get()), integerValues);
         }
-        EXPECT_EQ(elementsOf<double>(doubles.get()), doubleValues);
-        EXPECT_EQ(elementsOf<unsigned char>(integers.get()), integerValues);
-    }
 }
 
 // An allocation failure at each step (the conversion of integer counts for
