@@ -57,7 +57,8 @@ ScalarShift scalarShiftFor(U c) noexcept {
 // Every element of `in` shifted as `shift` says, into `out`. The SIMD shifts
 // go parallel from their limits; the fills and the signed 64-bit right
 // shift, which SSE2 can't do in registers, always run on the calling thread.
-// `valueStride` is 0 only when n is 1.
+// `valueStride` is 0 only when n is 1, so the serial loops read `in` with
+// unit stride.
 template <class T>
 void shiftByOneCount(T* out, const T* in, unsigned long valueStride, unsigned long n,
                      ScalarShift shift) {
@@ -70,8 +71,7 @@ void shiftByOneCount(T* out, const T* in, unsigned long valueStride, unsigned lo
         case ScalarShift::right:
             if constexpr (std::is_same_v<T, long>) {
                 const int k = static_cast<int>(shift.amount);
-                for (unsigned long i = 0; i < n; ++i)
-                    out[i] = shiftRightWithin(in[i * valueStride], k);
+                for (unsigned long i = 0; i < n; ++i) out[i] = shiftRightWithin(in[i], k);
             } else {
                 RightShift::run(out, in, valueStride, n, shift.amount);
             }
