@@ -139,7 +139,7 @@ zqArraySlot transposeArray(const zqArray_tag& source, bool conjugate) {
     const std::size_t columns = dims[1];
     const bool complex = host::isComplex(source);
     ElementWriter writer(host::classOf(source), {columns, rows}, complex);
-    for (std::size_t row = 0; row < rows; ++row) {
+    for (std::size_t row = 0; row < rows && columns != 0; ++row) {
         for (std::size_t column = 0; column < columns; ++column)
             writer.append(source, row + column * rows, 1);
     }
@@ -184,17 +184,21 @@ zqArraySlot concatenate(std::size_t dimension, std::span<const zqArray_tag* cons
                              dimension == 0 ? "vertically." : "horizontally."));
             }
         }
-        result[dimension] += dims[dimension];
+        if (__builtin_add_overflow(result[dimension], dims[dimension], &result[dimension])) {
+            throw CalcError(errorid::tooLarge, "The concatenated array is too large.");
+        }
         complex = complex || host::isComplex(*piece);
         sparse = sparse || host::isSparse(*piece);
     }
 
+    // The writer refuses sizes whose product overflows; with none of them 0,
+    // the products below are then exact. With one, nothing is copied.
+    ElementWriter writer(cls, result, complex);
     std::size_t inner = 1;
     for (std::size_t d = 0; d < dimension; ++d) inner *= result[d];
     std::size_t outer = 1;
     for (std::size_t d = dimension + 1; d < rank; ++d) outer *= result[d];
-
-    ElementWriter writer(cls, result, complex);
+    if (elementCountOf(result) == 0) outer = 0;
     for (std::size_t o = 0; o < outer; ++o) {
         for (const zqArray_tag* piece : kept) {
             const std::size_t block = inner * paddedTo(host::dimensions(*piece), rank)[dimension];
