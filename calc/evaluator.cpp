@@ -5,7 +5,6 @@
 #include "calc/arithmetic.hpp"
 #include "calc/array_building.hpp"
 #include "calc/builtins.hpp"
-#include "calc/conversion.hpp"
 #include "calc/errors.hpp"
 #include "calc/parser.hpp"
 #include "calc/text_join.hpp"
@@ -52,7 +51,7 @@ std::optional<double> rangeOperand(const zqArray_tag& array) {
     if (isEmpty(array)) return std::nullopt;
     if (!isScalar(array))
         throw CalcError(errorid::invalidArgument, "The operands of a range must be scalars.");
-    return elementAsDouble(array, 0);
+    return elementValue(array, 0);
 }
 
 }  // namespace
@@ -279,25 +278,15 @@ Value Evaluator::evaluateRange(const RangeExpr& range) {
     const std::optional<Value> step =
         range.step ? std::optional<Value>(evaluate(*range.step)) : std::nullopt;
     const Value last = evaluate(*range.last);
-    const std::optional<double> from = rangeOperand(first.array());
-    const std::optional<double> by = step ? rangeOperand(step->array()) : 1.0;
-    const std::optional<double> to = rangeOperand(last.array());
-    if (!from || !by || !to) return Value::fresh(filledArray(zqDoubleClass, {1, 0}, 0));
-    zqArraySlot values = rangeArray(*from, *by, *to);
-
-    // An integer operand makes an integer range, a single one a single range.
-    zqClassID cls = zqDoubleClass;
-    for (const Value* operand : {&first, step ? &*step : nullptr, &last}) {
-        if (!operand) continue;
-        const zqClassID operandClass = host::classOf(operand->array());
-        if (host::isIntegerClass(operandClass)) {
-            cls = operandClass;
-            break;
-        }
-        if (operandClass == zqSingleClass) cls = zqSingleClass;
-    }
-    if (cls != zqDoubleClass) values = convertArray(*values, cls);
-    return Value::fresh(std::move(values));
+    const std::optional<long double> from = rangeOperand(first.array());
+    const std::optional<long double> by = step ? rangeOperand(step->array()) : 1.0L;
+    const std::optional<long double> to = rangeOperand(last.array());
+    // A range takes its class as arithmetic does: an integer operand makes an
+    // integer range, a single one a single range.
+    zqClassID cls = resultClassOf(host::classOf(first.array()), host::classOf(last.array()));
+    if (step) cls = resultClassOf(cls, host::classOf(step->array()));
+    if (!from || !by || !to) return Value::fresh(filledArray(cls, {1, 0}, 0));
+    return Value::fresh(rangeArray(cls, *from, *by, *to));
 }
 
 }  // namespace bitcalc
