@@ -109,18 +109,6 @@ TEST(CallingShape, MissingOutputsAndRefusals) {
     EXPECT_EQ(session.evaluator.variable("y"), nullptr);
 }
 
-TEST(Run, StopsAtTheFirstErrorUnlessKeptGoing) {
-    std::ostringstream out;
-    const auto display = makeCanonicalDisplay(out);
-    Evaluator evaluator(*display, fakeFunctions);
-    EXPECT_FALSE(evaluator.run("a = 1\nb = (2\nc = 3", false));
-    EXPECT_EQ(out.str(), "a = double 1x1 [1]\nerror: bitcalc:syntax\n");
-    EXPECT_EQ(evaluator.variable("c"), nullptr);
-    EXPECT_FALSE(evaluator.run("b = (2\nc = 3", true));
-    EXPECT_NE(evaluator.variable("c"), nullptr);
-    EXPECT_TRUE(evaluator.run("d = 4;", false));
-}
-
 std::string humanText(std::string_view source) {
     std::ostringstream out;
     std::ostringstream errors;
