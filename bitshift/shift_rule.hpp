@@ -10,6 +10,7 @@
 #include "frame/class_types.hpp"
 #include "frame/integer_conversion.hpp"
 
+#include <cmath>
 #include <type_traits>
 
 namespace bitfcns {
@@ -69,11 +70,10 @@ struct BitshiftFtor {
 
     double operator()(double x, double c) const noexcept {
         constexpr double w = bitWidth<T>;
-        if (c >= w || c <= -w) return x < 0 && c < 0 ? -1.0 : 0.0;
+        if (!(std::fabs(c) < w)) return x < 0 && c < 0 ? -1.0 : 0.0;
+        const int k = static_cast<int>(c);
         const T value = wholeDoubleTo<T>(x);
-        const T shifted = c > 0 ? shiftLeftWithin(value, static_cast<int>(c))
-                                : shiftRightWithin(value, static_cast<int>(-c));
-        return integerToDouble(shifted);
+        return integerToDouble(k > 0 ? shiftLeftWithin(value, k) : shiftRightWithin(value, -k));
     }
 };
 
