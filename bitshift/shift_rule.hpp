@@ -11,6 +11,7 @@
 #include "frame/integer_conversion.hpp"
 
 #include <cmath>
+#include <cstdint>
 #include <type_traits>
 
 namespace bitfcns {
@@ -43,9 +44,10 @@ T shiftedOut(T x, U c) noexcept {
 }
 
 // The shift rule for a value x of class T and a count c of class U (a
-// floating count is whole and finite, tested before). The count is compared
-// as a double with the width, which is exact where it matters: a 64-bit
-// count that a double doesn't hold is far beyond any width.
+// floating count is whole and finite, tested before). Whether the count lies
+// within the width is asked once: of an integer count exactly, as one
+// unsigned compare; of a floating count as a double, which holds every count
+// near the width exactly.
 template <class T, class U>
 struct bitshiftVVFtor {
     static constexpr unsigned long parallelLimit = limits::bitshiftCountArray;
@@ -53,11 +55,24 @@ struct bitshiftVVFtor {
     int nbits;  // the width of T
 
     T operator()(T x, U c) const noexcept {
-        const double d = static_cast<double>(c);
-        const double w = nbits;
-        if (d >= w || d <= -w) return shiftedOut(x, c);
+        if (!withinWidth(c)) return shiftedOut(x, c);
         const int k = static_cast<int>(c);
         return k > 0 ? shiftLeftWithin(x, k) : shiftRightWithin(x, -k);
+    }
+
+private:
+    // -nbits < c < nbits. For a signed count, c + nbits - 1 read as unsigned
+    // 64-bit (wrapping) is at most 2 nbits - 2 exactly then.
+    bool withinWidth(U c) const noexcept {
+        const auto w = static_cast<std::uint64_t>(nbits);
+        if constexpr (std::is_floating_point_v<U>) {
+            const double d = c;
+            return d < nbits && d > -nbits;
+        } else if constexpr (std::is_signed_v<U>) {
+            return static_cast<std::uint64_t>(static_cast<std::int64_t>(c)) + (w - 1) <= 2 * w - 2;
+        } else {
+            return static_cast<std::uint64_t>(c) < w;
+        }
     }
 };
 
