@@ -1,0 +1,443 @@
+// bitget through its entry point: every position class against every value
+// class, the double path in each assumed class, the order of refusals, the
+// boundaries of the scans, serial against parallel runs at each limit, and
+// results that take over a flagged operand's storage.
+#include "bitfcns/entry_points.hpp"
+#include "host/array_factory.hpp"
+#include "host/host_control.hpp"
+#include "tests/support/host_arrays.hpp"
+
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <limits>
+#include <new>
+#include <random>
+#include <string>
+#include <tuple>
+#include <type_traits>
+#include <vector>
+
+namespace {
+
+using namespace testing_support;
+
+constexpr double nan = std::numeric_limits<double>::quiet_NaN();
+constexpr double inf = std::numeric_limits<double>::infinity();
+
+CallOutcome bitget(std::vector<const zqArray_tag*> inputs, int nlhs = 1) {
+    return callEntry(&ondelBitGetFcn, std::move(inputs), nlhs);
+}
+
+zqArraySlot text(std::u16string_view value) { return host::makeCharArray(value); }
+
+zqArraySlot flagged(zqArraySlot array) {
+    host::setWantsSharedResult(*array, true);
+    return array;
+}
+
+template <class T>
+constexpr int widthOf = static_cast<int>(sizeof(T) * 8);
+
+// Bit p - 1 of a's stored pattern, in 64-bit arithmetic.
+template <class T>
+T bitModel(T a, int p) {
+    const auto pattern = static_cast<std::uint64_t>(static_cast<std::make_unsigned_t<T>>(a));
+    return static_cast<T>((pattern >> (p - 1)) & 1);
+}
+
+template <class T>
+std::vector<T> randomValues(std::size_t n, std::uint64_t seed) {
+    std::vector<T> values{std::numeric_limits<T>::min(), std::numeric_limits<T>::max(), T(0)};
+    std::mt19937_64 random(seed);
+    while (values.size() < n) values.push_back(static_cast<T>(random()));
+    values.resize(n);
+    return values;
+}
+
+// Calls f(U{}) for each of the ten numeric classes of a position.
+template <class F>
+void forEachPositionClass(F f) {
+    std::apply([&](auto... tags) { (f(tags), ...); },
+               std::tuple<signed char, unsigned char, short, unsigned short, int, unsigned int,
+                          long, unsigned long, float, double>{});
+}
+
+template <class T>
+class IntegerValues : public ::testing::Test {
+protected:
+    void SetUp() override { liveBefore_ = host::liveArrayCount(); }
+    void TearDown() override { EXPECT_EQ(host::liveArrayCount(), liveBefore_) << "arrays leaked"; }
+
+private:
+    std::size_t liveBefore_ = 0;
+};
+using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                      unsigned int, long, unsigned long>;
+TYPED_TEST_SUITE(IntegerValues, IntegerTypes);
+
+TYPED_TEST(IntegerValues, EveryPositionClassReadsTheBitsOfTheValueClass) {
+    using T = TypeParam;
+    constexpr int width = widthOf<T>;
+    const std::vector<T> values = randomValues<T>(2 * width, 1);
+    forEachPositionClass([&]<class U>(U) {
+        SCOPED_TRACE(testing::Message() << "position class " << classIdOf<U>);
+        std::vector<U> positions;
+        for (int i = 0; i < 2 * width; ++i) positions.push_back(static_cast<U>(i % width + 1));
+        const auto a = makeOf(values, {2, static_cast<unsigned long>(width)});
+        const auto p = makeOf(positions, {2, static_cast<unsigned long>(width)});
+        const auto arrays = bitget({a.get(), p.get()});
+        ASSERT_EQ(arrays.error, "");
+        EXPECT_EQ(host::classOf(*arrays.result), classIdOf<T>);
+        EXPECT_EQ(host::dimensions(*arrays.result), host::dimensions(*a));
+        const auto bits = elementsOf<T>(arrays.result.get());
+        for (std::size_t i = 0; i < values.size(); ++i)
+            ASSERT_EQ(bits[i], bitModel(values[i], i % width + 1)) << i;
+
+        for (int position : {1, width / 2, width}) {
+            const auto one = scalarOf(static_cast<U>(position));
+            const auto scalar = bitget({a.get(), one.get()});
+            ASSERT_EQ(scalar.error, "");
+            const auto got = elementsOf<T>(scalar.result.get());
+            for (std::size_t i = 0; i < values.size(); ++i)
+                ASSERT_EQ(got[i], bitModel(values[i], position)) << position << ", " << i;
+        }
+
+        // A scalar value with positions: the result has the positions' sizes.
+        const auto minimum = scalarOf(std::numeric_limits<T>::min());
+        const auto column = makeOf(positions, {static_cast<unsigned long>(2 * width), 1});
+        const auto spread = bitget({minimum.get(), column.get()});
+        ASSERT_EQ(spread.error, "");
+        EXPECT_EQ(host::dimensions(*spread.result), host::dimensions(*column));
+        const auto signBits = elementsOf<T>(spread.result.get());
+        for (std::size_t i = 0; i < signBits.size(); ++i)
+            ASSERT_EQ(signBits[i], bitModel(std::numeric_limits<T>::min(), i % width + 1));
+    });
+}
+
+TYPED_TEST(IntegerValues, PositionsOutsideOneToTheWidthAreRefused) {
+    using T = TypeParam;
+    constexpr int width = widthOf<T>;
+    const auto a = flagged(makeOf<T>({1, 2, 3}));
+    forEachPositionClass([&]<class U>(U) {
+        SCOPED_TRACE(testing::Message() << "position class " << classIdOf<U>);
+        std::vector<U> bad{U(0), static_cast<U>(width + 1), static_cast<U>(127)};
+        if constexpr (std::is_signed_v<U>) bad.push_back(U(-1));
+        if constexpr (std::is_same_v<U, unsigned char>) bad.push_back(U(255));
+        if constexpr (std::is_floating_point_v<U>)
+            bad.insert(bad.end(), {U(1.5), U(width - 0.5), U(nan), U(inf), U(-inf)});
+        for (U position : bad) {
+            SCOPED_TRACE(testing::Message() << +position);
+            EXPECT_EQ(bitget({a.get(), scalarOf(position).get()}).error,
+                      "VESPRA:bitSetGet:BITOutOfRange");
+            // The last position of an array is read before any value is written.
+            const auto p = makeOf<U>({U(1), static_cast<U>(width), position});
+            EXPECT_EQ(bitget({a.get(), p.get()}).error, "VESPRA:bitSetGet:BITOutOfRange");
+            EXPECT_EQ(elementsOf<T>(a.get()), (std::vector<T>{1, 2, 3}));
+            // A scalar position is tested even when there are no values.
+            const auto empty = makeOf<T>({}, {0, 3});
+            EXPECT_EQ(bitget({empty.get(), scalarOf(position).get()}).error,
+                      "VESPRA:bitSetGet:BITOutOfRange");
+        }
+        const auto empty = makeOf<T>({}, {0, 3});
+        const auto noPositions = makeOf<U>({}, {0, 3});
+        const auto none = bitget({empty.get(), noPositions.get()});
+        ASSERT_EQ(none.error, "");
+        EXPECT_EQ(host::dimensions(*none.result), (host::Dims{0, 3}));
+    });
+}
+
+// Below and at each parallel limit, fresh and in place, the bits agree with
+// the scalar model: one position through the SIMD family (the limit falls
+// with the width), an array of positions through the plain loop.
+TYPED_TEST(IntegerValues, SerialAndParallelRunsAgreeFreshAndInPlace) {
+    using T = TypeParam;
+    constexpr int width = widthOf<T>;
+    constexpr unsigned long oneBitLimit = sizeof(T) == 1   ? 4500000
+                                          : sizeof(T) == 2 ? 3500000
+                                          : sizeof(T) == 4 ? 2000000
+                                                           : 1000000;
+    for (unsigned long n : {oneBitLimit - 1, oneBitLimit, 29999ul, 30000ul}) {
+        const bool positionArray = n < 100000;
+        const std::vector<T> values = randomValues<T>(n, n);
+        std::vector<double> positions(positionArray ? n : 1, double(width));
+        for (std::size_t i = 0; i < positions.size() && positionArray; ++i)
+            positions[i] = static_cast<double>(i * 7 % width + 1);
+        const auto p = makeOf(positions);
+        for (bool inPlace : {false, true}) {
+            SCOPED_TRACE(testing::Message() << n << (inPlace ? " in place" : " fresh"));
+            const auto a = makeOf(values);
+            host::setWantsSharedResult(*a, inPlace);
+            const auto outcome = bitget({a.get(), p.get()});
+            ASSERT_EQ(outcome.error, "");
+            EXPECT_EQ(host::storageIdentity(*outcome.result) == host::storageIdentity(*a), inPlace);
+            const auto bits = elementsOf<T>(outcome.result.get());
+            for (std::size_t i = 0; i < n; ++i) {
+                const int position = static_cast<int>(positions[positionArray ? i : 0]);
+                ASSERT_EQ(bits[i], bitModel(values[i], position)) << i;
+            }
+        }
+    }
+}
+
+// The double path, one row per case: a value taken for an integer of the
+// assumed class (uint64 when none is named), a position, the bit.
+struct DoubleCase {
+    double value;
+    double position;
+    const char16_t* assumed;
+    double expected;
+};
+
+TEST(DoubleValues, BitsOfTheAssumedClass) {
+    const DoubleCase cases[] = {
+        {5, 1, nullptr, 1},
+        {5, 2, nullptr, 0},
+        {5, 3, nullptr, 1},
+        {5, 64, nullptr, 0},
+        {5, 8, u"uint8", 0},
+        {-1, 8, u"int8", 1},
+        {-128, 8, u"int8", 1},
+        {-128, 7, u"int8", 0},
+        {255, 8, u"uint8", 1},
+        {-1, 16, u"int16", 1},
+        {65535, 16, u"UINT16", 1},
+        {-2147483648.0, 32, u"int32", 1},
+        {-2147483648.0, 31, u"int3", 0},
+        {4294967295.0, 32, u"uint32", 1},
+        {-9223372036854775808.0, 64, u"int64", 1},
+        {-9223372036854775808.0, 63, u"int64", 0},
+        {9223372036854775808.0, 64, nullptr, 1},
+        {9223372036854775808.0, 63, nullptr, 0},
+        {18446744073709549568.0, 12, u"uint64", 1},  // 2^64 - 2^11
+        {18446744073709549568.0, 11, u"uint64", 0},
+        {-0.0, 1, u"uint8", 0},
+    };
+    for (const DoubleCase& c : cases) {
+        SCOPED_TRACE(testing::Message() << c.value << " at " << c.position);
+        const auto value = scalarOf(c.value);
+        const auto position = scalarOf(c.position);
+        const auto assumed = c.assumed ? text(c.assumed) : nullptr;
+        const auto outcome = c.assumed ? bitget({value.get(), position.get(), assumed.get()})
+                                       : bitget({value.get(), position.get()});
+        ASSERT_EQ(outcome.error, "");
+        EXPECT_EQ(host::classOf(*outcome.result), zqDoubleClass);
+        EXPECT_EQ(elementsOf<double>(outcome.result.get()), std::vector<double>{c.expected});
+    }
+}
+
+// Below and at the limit, a scalar value or position against arrays, fresh
+// and in place.
+TEST(DoubleValues, SerialAndParallelRunsAgree) {
+    for (unsigned long n : {7999ul, 8000ul}) {
+        std::vector<double> values(n), positions(n);
+        for (unsigned long i = 0; i < n; ++i) {
+            values[i] = static_cast<double>(i * 2654435761u % 65536) - 32768;
+            positions[i] = static_cast<double>(i % 16 + 1);
+        }
+        const auto expected = [&](double v, double p) {
+            return double((static_cast<std::uint16_t>(v) >> (static_cast<int>(p) - 1)) & 1);
+        };
+        const auto int16 = text(u"int16");
+        const auto p = makeOf(positions);
+        const auto five = scalarOf(5.0);
+        const auto spread = bitget({five.get(), p.get(), int16.get()});
+        ASSERT_EQ(spread.error, "");
+        for (bool inPlace : {false, true}) {
+            const auto a = makeOf(values);
+            host::setWantsSharedResult(*a, inPlace);
+            const auto arrays = bitget({a.get(), p.get(), int16.get()});
+            ASSERT_EQ(arrays.error, "");
+            EXPECT_EQ(host::storageIdentity(*arrays.result) == host::storageIdentity(*a), inPlace);
+            const auto bits = elementsOf<double>(arrays.result.get());
+            const auto spreadBits = elementsOf<double>(spread.result.get());
+            for (unsigned long i = 0; i < n; ++i) {
+                ASSERT_EQ(bits[i], expected(values[i], positions[i])) << n << ", " << i;
+                ASSERT_EQ(spreadBits[i], expected(5, positions[i])) << n << ", " << i;
+            }
+        }
+    }
+}
+
+TEST(DoubleValues, IntegerPositionsAreConvertedToDouble) {
+    const auto values = makeOf<double>({5, 6, 255});
+    const auto positions = makeOf<unsigned short>({1, 2, 8});
+    const auto outcome = bitget({values.get(), positions.get(), text(u"uint8").get()});
+    ASSERT_EQ(outcome.error, "");
+    EXPECT_EQ(host::classOf(*outcome.result), zqDoubleClass);
+    EXPECT_EQ(elementsOf<double>(outcome.result.get()), (std::vector<double>{1, 1, 1}));
+}
+
+// Refusals: each with the identifier that the order of tests gives first, and
+// whether the result already stood in the slot when the refusal came.
+struct Refusal {
+    const char* what;
+    std::vector<zqArraySlot> inputs;
+    std::string expected;
+    bool resultInSlot = false;
+    int nlhs = 1;
+};
+
+zqArraySlot sparse(zqArraySlot array) {
+    host::setSparse(*array, true);
+    return array;
+}
+
+template <class T>
+zqArraySlot complexOf(std::vector<T> values) {
+    auto array = makeOf(values);
+    host::makeComplex(*array, std::as_bytes(std::span<const T>(values)));
+    return array;
+}
+
+template <class... Arrays>
+std::vector<zqArraySlot> inputs(Arrays... arrays) {
+    std::vector<zqArraySlot> list;
+    (list.push_back(std::move(arrays)), ...);
+    return list;
+}
+
+std::vector<Refusal> refusals() {
+    const auto d = [](std::vector<double> v, host::Dims dims = {}) { return makeOf(v, dims); };
+    const auto u8 = [](std::vector<unsigned char> v, host::Dims dims = {}) {
+        return makeOf(v, dims);
+    };
+    std::vector<Refusal> cases;
+    const auto add = [&](const char* what, std::vector<zqArraySlot> in, std::string expected,
+                         bool resultInSlot = false) {
+        cases.push_back({what, std::move(in), std::move(expected), resultInSlot});
+    };
+    cases.push_back({"two outputs, four inputs", inputs(d({1}), d({1}), d({1}), d({1})),
+                     "VESPRA:maxlhs", false, 2});
+    add("four inputs", inputs(d({1}), d({1}), d({1}), d({1})), "VESPRA:maxrhs");
+    add("one input", inputs(d({1})), "VESPRA:minrhs");
+
+    // Double path: sparse, complex, size, type (after the result), values,
+    // positions.
+    add("sparse position, complex value", inputs(complexOf<double>({1}), sparse(d({1}))),
+        "VESPRA:bitget:sparseArgs");
+    add("complex position, sizes differ", inputs(d({1, 2}), complexOf<double>({1, 2, 3})),
+        "VESPRA:bitget:complexArgs");
+    add("sizes differ, bad type", inputs(d({1, 2}), d({1, 2, 3}), text(u"int7")),
+        "VESPRA:bitget:sizeMismatch");
+    add("row against column", inputs(d({1, 2, 3, 4}), d({1, 2, 3, 4}, {4, 1})),
+        "VESPRA:bitget:sizeMismatch");
+    add("2x2 against empty", inputs(d({1, 2, 3, 4}, {2, 2}), d({}, {0, 0})),
+        "VESPRA:bitget:sizeMismatch");
+    add("'double', bad value", inputs(d({-1}), d({1}), text(u"double")),
+        "VESPRA:bitget:unknownTypeString", true);
+    add("7 as type", inputs(d({5}), d({1}), d({7})), "VESPRA:bitget:unknownTypeString", true);
+    add("bad value, bad position", inputs(d({1, 256}), d({9, 1}), text(u"uint8")),
+        "VESPRA:bitget:outOfRange", true);
+    add("-1 unsigned", inputs(d({-1}), d({1})), "VESPRA:bitget:outOfRange", true);
+    add("1.5 value", inputs(d({1.5}), d({1})), "VESPRA:bitget:outOfRange", true);
+    add("NaN value", inputs(d({nan}), d({1})), "VESPRA:bitget:outOfRange", true);
+    add("2^64 value", inputs(d({18446744073709551616.0}), d({1})), "VESPRA:bitget:outOfRange",
+        true);
+    add("bad scalar value, empty positions", inputs(d({-1}), d({}, {1, 0})),
+        "VESPRA:bitget:outOfRange", true);
+    add("position 65", inputs(d({5}), d({65})), "VESPRA:bitSetGet:BITOutOfRange", true);
+    add("position 9 of uint8", inputs(d({5}), d({9}), text(u"uint8")),
+        "VESPRA:bitSetGet:BITOutOfRange", true);
+    add("position 0", inputs(d({5}), d({0})), "VESPRA:bitSetGet:BITOutOfRange", true);
+    add("position 1.5", inputs(d({5}), d({1.5})), "VESPRA:bitSetGet:BITOutOfRange", true);
+    add("position NaN", inputs(d({5}), d({nan})), "VESPRA:bitSetGet:BITOutOfRange", true);
+    add("empty values, bad scalar position", inputs(d({}, {0, 2}), d({0})),
+        "VESPRA:bitSetGet:BITOutOfRange", true);
+
+    // Integer path: sparse, numeric, class, complex, size, type, positions.
+    add("sparse, logical", inputs(sparse(u8({1})), makeOf<bool>({true})),
+        "VESPRA:bitget:sparseArgs");
+    add("logical value", inputs(makeOf<bool>({true}), d({1})), "VESPRA:bitget:numericArg");
+    add("char position, single value", inputs(makeOf<float>({1}), text(u"a")),
+        "VESPRA:bitget:numericArg");
+    add("single value", inputs(makeOf<float>({5}), d({1})), "VESPRA:bitSetGet:firstArgNotInt");
+    add("double value, single position", inputs(d({5}), makeOf<float>({3})),
+        "VESPRA:bitSetGet:firstArgNotInt");
+    add("complex single value", inputs(complexOf<float>({5}), d({1})),
+        "VESPRA:bitSetGet:firstArgNotInt");
+    add("complex position, sizes differ", inputs(u8({1, 2}), complexOf<double>({1, 2, 3})),
+        "VESPRA:bitget:complexArgs");
+    add("2x3 against 3x2, bad type",
+        inputs(u8({1, 2, 3, 4, 5, 6}, {2, 3}), u8({1, 2, 3, 4, 5, 6}, {3, 2}), text(u"int7")),
+        "VESPRA:bitSetGet:sizeMismatch");
+    add("'double', bad position", inputs(u8({5}), d({9}), text(u"double")),
+        "VESPRA:bitget:unknownTypeString");
+    add("'uint16' for uint8, bad position", inputs(u8({5}), d({9}), text(u"uint16")),
+        "VESPRA:bitget:invalidTypeString");
+    add("position 9 of uint8", inputs(u8({5}), makeOf<short>({9})),
+        "VESPRA:bitSetGet:BITOutOfRange");
+
+    // A double value with integer positions takes the double path's errors.
+    add("double value, integer positions, sizes differ", inputs(d({1, 2}), u8({1, 2, 3})),
+        "VESPRA:bitget:sizeMismatch");
+    add("double value, integer position 9 of uint8", inputs(d({5}), u8({9}), text(u"uint8")),
+        "VESPRA:bitSetGet:BITOutOfRange");
+    return cases;
+}
+
+TEST(Refusals, FirstFailingTestNamesTheError) {
+    for (Refusal& refusal : refusals()) {
+        SCOPED_TRACE(refusal.what);
+        std::vector<const zqArray_tag*> in;
+        for (const auto& input : refusal.inputs) in.push_back(input.get());
+        const std::size_t liveBefore = host::liveArrayCount();
+        {
+            const auto outcome = bitget(in, refusal.nlhs);
+            EXPECT_EQ(outcome.error, refusal.expected);
+            EXPECT_EQ(outcome.result != nullptr, refusal.resultInSlot);
+        }
+        EXPECT_EQ(host::liveArrayCount(), liveBefore) << "an array was left behind";
+    }
+}
+
+TEST(Refusals, RefusedCallsLeaveFlaggedStorageAsItWas) {
+    const auto doubles = flagged(makeOf<double>({1, 2, 3}));
+    EXPECT_EQ(bitget({doubles.get(), makeOf<double>({1, 2, 0}).get()}).error,
+              "VESPRA:bitSetGet:BITOutOfRange");
+    EXPECT_EQ(bitget({doubles.get(), scalarOf(1.0).get(), text(u"int7").get()}).error,
+              "VESPRA:bitget:unknownTypeString");
+    EXPECT_EQ(elementsOf<double>(doubles.get()), (std::vector<double>{1, 2, 3}));
+
+    const auto shared = bitget({doubles.get(), scalarOf(2.0).get()});
+    ASSERT_EQ(shared.error, "");
+    EXPECT_EQ(host::storageIdentity(*shared.result), host::storageIdentity(*doubles));
+    EXPECT_EQ(elementsOf<double>(doubles.get()), (std::vector<double>{0, 1, 1}));
+
+    // A scalar never gives up its storage.
+    const auto scalar = flagged(scalarOf<unsigned char>(6));
+    const auto fresh = bitget({scalar.get(), scalarOf(2.0).get()});
+    ASSERT_EQ(fresh.error, "");
+    EXPECT_NE(host::storageIdentity(*fresh.result), host::storageIdentity(*scalar));
+    EXPECT_EQ(elementsOf<unsigned char>(scalar.get()), std::vector<unsigned char>{6});
+}
+
+TEST(Refusals, AllocationFailureAtEachStepLeavesNothingBehind) {
+    const auto u8 = makeOf<unsigned char>({5, 6});
+    const auto d = makeOf<double>({5, 6});
+    const auto positions = makeOf<unsigned char>({1, 2});
+    for (const zqArray_tag* values : {u8.get(), d.get()}) {
+        std::size_t successes = 0;
+        for (; successes < 8; ++successes) {
+            SCOPED_TRACE(testing::Message() << "class " << values->classId << ", after "
+                                            << successes << " allocations");
+            const std::size_t liveBefore = host::liveArrayCount();
+            zqArraySlot slot;
+            const zqArray_tag* in[] = {values, positions.get()};
+            host::failNextAllocations(1, successes);
+            bool failed = false;
+            try {
+                ondelBitGetFcn(1, &slot, 2, in);
+            } catch (const std::bad_alloc&) {
+                failed = true;
+            }
+            host::failNextAllocations(0);
+            if (!failed) break;
+            EXPECT_EQ(slot, nullptr);
+            EXPECT_EQ(host::liveArrayCount(), liveBefore);
+        }
+        EXPECT_GE(successes, values == d.get() ? 2u : 1u);  // the conversion, then the result
+    }
+}
+
+}  // namespace
