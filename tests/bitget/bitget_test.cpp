@@ -180,52 +180,6 @@ TYPED_TEST(IntegerValues, SerialAndParallelRunsAgreeFreshAndInPlace) {
     }
 }
 
-// The double path, one row per case: a value taken for an integer of the
-// assumed class (uint64 when none is named), a position, the bit.
-struct DoubleCase {
-    double value;
-    double position;
-    const char16_t* assumed;
-    double expected;
-};
-
-TEST(DoubleValues, BitsOfTheAssumedClass) {
-    const DoubleCase cases[] = {
-        {5, 1, nullptr, 1},
-        {5, 2, nullptr, 0},
-        {5, 3, nullptr, 1},
-        {5, 64, nullptr, 0},
-        {5, 8, u"uint8", 0},
-        {-1, 8, u"int8", 1},
-        {-128, 8, u"int8", 1},
-        {-128, 7, u"int8", 0},
-        {255, 8, u"uint8", 1},
-        {-1, 16, u"int16", 1},
-        {65535, 16, u"UINT16", 1},
-        {-2147483648.0, 32, u"int32", 1},
-        {-2147483648.0, 31, u"int3", 0},
-        {4294967295.0, 32, u"uint32", 1},
-        {-9223372036854775808.0, 64, u"int64", 1},
-        {-9223372036854775808.0, 63, u"int64", 0},
-        {9223372036854775808.0, 64, nullptr, 1},
-        {9223372036854775808.0, 63, nullptr, 0},
-        {18446744073709549568.0, 12, u"uint64", 1},  // 2^64 - 2^11
-        {18446744073709549568.0, 11, u"uint64", 0},
-        {-0.0, 1, u"uint8", 0},
-    };
-    for (const DoubleCase& c : cases) {
-        SCOPED_TRACE(testing::Message() << c.value << " at " << c.position);
-        const auto value = scalarOf(c.value);
-        const auto position = scalarOf(c.position);
-        const auto assumed = c.assumed ? text(c.assumed) : nullptr;
-        const auto outcome = c.assumed ? bitget({value.get(), position.get(), assumed.get()})
-                                       : bitget({value.get(), position.get()});
-        ASSERT_EQ(outcome.error, "");
-        EXPECT_EQ(host::classOf(*outcome.result), zqDoubleClass);
-        EXPECT_EQ(elementsOf<double>(outcome.result.get()), std::vector<double>{c.expected});
-    }
-}
-
 // Below and at the limit, a scalar value or position against arrays, fresh
 // and in place.
 TEST(DoubleValues, SerialAndParallelRunsAgree) {
@@ -259,36 +213,16 @@ TEST(DoubleValues, SerialAndParallelRunsAgree) {
     }
 }
 
-TEST(DoubleValues, IntegerPositionsAreConvertedToDouble) {
-    const auto values = makeOf<double>({5, 6, 255});
-    const auto positions = makeOf<unsigned short>({1, 2, 8});
-    const auto outcome = bitget({values.get(), positions.get(), text(u"uint8").get()});
-    ASSERT_EQ(outcome.error, "");
-    EXPECT_EQ(host::classOf(*outcome.result), zqDoubleClass);
-    EXPECT_EQ(elementsOf<double>(outcome.result.get()), (std::vector<double>{1, 1, 1}));
-}
-
-// Refusals: each with the identifier that the order of tests gives first, and
-// whether the result already stood in the slot when the refusal came.
+// Refusals whose point the evaluator can't show: the double path has put its
+// result into the slot before it tests the assumed type and the elements; a
+// double value with integer positions keeps it in a local slot instead. No
+// array is left behind either way. (The order of reports is in bitget.case.)
 struct Refusal {
     const char* what;
     std::vector<zqArraySlot> inputs;
     std::string expected;
-    bool resultInSlot = false;
-    int nlhs = 1;
+    bool resultInSlot;
 };
-
-zqArraySlot sparse(zqArraySlot array) {
-    host::setSparse(*array, true);
-    return array;
-}
-
-template <class T>
-zqArraySlot complexOf(std::vector<T> values) {
-    auto array = makeOf(values);
-    host::makeComplex(*array, std::as_bytes(std::span<const T>(values)));
-    return array;
-}
 
 template <class... Arrays>
 std::vector<zqArraySlot> inputs(Arrays... arrays) {
@@ -299,80 +233,28 @@ std::vector<zqArraySlot> inputs(Arrays... arrays) {
 
 std::vector<Refusal> refusals() {
     const auto d = [](std::vector<double> v, host::Dims dims = {}) { return makeOf(v, dims); };
-    const auto u8 = [](std::vector<unsigned char> v, host::Dims dims = {}) {
-        return makeOf(v, dims);
-    };
+    const auto u8 = [](std::vector<unsigned char> v) { return makeOf(v); };
     std::vector<Refusal> cases;
     const auto add = [&](const char* what, std::vector<zqArraySlot> in, std::string expected,
-                         bool resultInSlot = false) {
+                         bool resultInSlot) {
         cases.push_back({what, std::move(in), std::move(expected), resultInSlot});
     };
-    cases.push_back({"two outputs, four inputs", inputs(d({1}), d({1}), d({1}), d({1})),
-                     "VESPRA:maxlhs", false, 2});
-    add("four inputs", inputs(d({1}), d({1}), d({1}), d({1})), "VESPRA:maxrhs");
-    add("one input", inputs(d({1})), "VESPRA:minrhs");
-
-    // Double path: sparse, complex, size, type (after the result), values,
-    // positions.
-    add("sparse position, complex value", inputs(complexOf<double>({1}), sparse(d({1}))),
-        "VESPRA:bitget:sparseArgs");
-    add("complex position, sizes differ", inputs(d({1, 2}), complexOf<double>({1, 2, 3})),
-        "VESPRA:bitget:complexArgs");
     add("sizes differ, bad type", inputs(d({1, 2}), d({1, 2, 3}), text(u"int7")),
-        "VESPRA:bitget:sizeMismatch");
-    add("row against column", inputs(d({1, 2, 3, 4}), d({1, 2, 3, 4}, {4, 1})),
-        "VESPRA:bitget:sizeMismatch");
-    add("2x2 against empty", inputs(d({1, 2, 3, 4}, {2, 2}), d({}, {0, 0})),
-        "VESPRA:bitget:sizeMismatch");
+        "VESPRA:bitget:sizeMismatch", false);
     add("'double', bad value", inputs(d({-1}), d({1}), text(u"double")),
         "VESPRA:bitget:unknownTypeString", true);
-    add("7 as type", inputs(d({5}), d({1}), d({7})), "VESPRA:bitget:unknownTypeString", true);
     add("bad value, bad position", inputs(d({1, 256}), d({9, 1}), text(u"uint8")),
         "VESPRA:bitget:outOfRange", true);
-    add("-1 unsigned", inputs(d({-1}), d({1})), "VESPRA:bitget:outOfRange", true);
-    add("1.5 value", inputs(d({1.5}), d({1})), "VESPRA:bitget:outOfRange", true);
-    add("NaN value", inputs(d({nan}), d({1})), "VESPRA:bitget:outOfRange", true);
-    add("2^64 value", inputs(d({18446744073709551616.0}), d({1})), "VESPRA:bitget:outOfRange",
-        true);
-    add("bad scalar value, empty positions", inputs(d({-1}), d({}, {1, 0})),
-        "VESPRA:bitget:outOfRange", true);
-    add("position 65", inputs(d({5}), d({65})), "VESPRA:bitSetGet:BITOutOfRange", true);
-    add("position 9 of uint8", inputs(d({5}), d({9}), text(u"uint8")),
-        "VESPRA:bitSetGet:BITOutOfRange", true);
-    add("position 0", inputs(d({5}), d({0})), "VESPRA:bitSetGet:BITOutOfRange", true);
-    add("position 1.5", inputs(d({5}), d({1.5})), "VESPRA:bitSetGet:BITOutOfRange", true);
-    add("position NaN", inputs(d({5}), d({nan})), "VESPRA:bitSetGet:BITOutOfRange", true);
     add("empty values, bad scalar position", inputs(d({}, {0, 2}), d({0})),
         "VESPRA:bitSetGet:BITOutOfRange", true);
-
-    // Integer path: sparse, numeric, class, complex, size, type, positions.
-    add("sparse, logical", inputs(sparse(u8({1})), makeOf<bool>({true})),
-        "VESPRA:bitget:sparseArgs");
-    add("logical value", inputs(makeOf<bool>({true}), d({1})), "VESPRA:bitget:numericArg");
-    add("char position, single value", inputs(makeOf<float>({1}), text(u"a")),
-        "VESPRA:bitget:numericArg");
-    add("single value", inputs(makeOf<float>({5}), d({1})), "VESPRA:bitSetGet:firstArgNotInt");
-    add("double value, single position", inputs(d({5}), makeOf<float>({3})),
-        "VESPRA:bitSetGet:firstArgNotInt");
-    add("complex single value", inputs(complexOf<float>({5}), d({1})),
-        "VESPRA:bitSetGet:firstArgNotInt");
-    add("complex position, sizes differ", inputs(u8({1, 2}), complexOf<double>({1, 2, 3})),
-        "VESPRA:bitget:complexArgs");
-    add("2x3 against 3x2, bad type",
-        inputs(u8({1, 2, 3, 4, 5, 6}, {2, 3}), u8({1, 2, 3, 4, 5, 6}, {3, 2}), text(u"int7")),
-        "VESPRA:bitSetGet:sizeMismatch");
-    add("'double', bad position", inputs(u8({5}), d({9}), text(u"double")),
-        "VESPRA:bitget:unknownTypeString");
-    add("'uint16' for uint8, bad position", inputs(u8({5}), d({9}), text(u"uint16")),
-        "VESPRA:bitget:invalidTypeString");
-    add("position 9 of uint8", inputs(u8({5}), makeOf<short>({9})),
-        "VESPRA:bitSetGet:BITOutOfRange");
-
-    // A double value with integer positions takes the double path's errors.
-    add("double value, integer positions, sizes differ", inputs(d({1, 2}), u8({1, 2, 3})),
-        "VESPRA:bitget:sizeMismatch");
-    add("double value, integer position 9 of uint8", inputs(d({5}), u8({9}), text(u"uint8")),
-        "VESPRA:bitSetGet:BITOutOfRange");
+    add("integer positions, bad type", inputs(d({5}), u8({1}), text(u"int7")),
+        "VESPRA:bitget:unknownTypeString", false);
+    add("integer position 9 of uint8", inputs(d({5}), u8({9}), text(u"uint8")),
+        "VESPRA:bitSetGet:BITOutOfRange", false);
+    add("integer values, bad type", inputs(u8({5}), d({1}), text(u"int7")),
+        "VESPRA:bitget:unknownTypeString", false);
+    add("integer values, position 9", inputs(u8({5}), d({9})), "VESPRA:bitSetGet:BITOutOfRange",
+        false);
     return cases;
 }
 
@@ -383,7 +265,7 @@ TEST(Refusals, FirstFailingTestNamesTheError) {
         for (const auto& input : refusal.inputs) in.push_back(input.get());
         const std::size_t liveBefore = host::liveArrayCount();
         {
-            const auto outcome = bitget(in, refusal.nlhs);
+            const auto outcome = bitget(in);
             EXPECT_EQ(outcome.error, refusal.expected);
             EXPECT_EQ(outcome.result != nullptr, refusal.resultInSlot);
         }
