@@ -24,7 +24,7 @@ namespace {
 // whole number from 1 to T's width.
 template <class T, class U>
 void requireValidPositions(const U* positions, unsigned long count) {
-    if (firstInvalidPosition(positions, count, bitWidth<T>) != count)
+    if (!allPositionsValid(positions, count, bitWidth<T>))
         raiseError<VESPRA::bitSetGet::BITOutOfRange>();
 }
 

@@ -36,4 +36,21 @@ unsigned long firstInvalidPosition(const U* positions, unsigned long n, int widt
     return n;
 }
 
+// True when each of the n positions passes bitIsValid. The answer is that of
+// testing them in order and stopping at the first failure; the stop comes at
+// the end of the failing position's block, so that within a block the test
+// has no branch and integer positions are tested a register at a time.
+template <class U>
+bool allPositionsValid(const U* positions, unsigned long n, int width) noexcept {
+    constexpr unsigned long blockPositions = 4096;
+    for (unsigned long block = 0; block < n; block += blockPositions) {
+        const unsigned long end = n - block < blockPositions ? n : block + blockPositions;
+        unsigned invalid = 0;
+        for (unsigned long i = block; i < end; ++i)
+            invalid |= bitIsValid(positions[i], width) ? 0u : 1u;
+        if (invalid != 0) return false;
+    }
+    return true;
+}
+
 }  // namespace bitfcns

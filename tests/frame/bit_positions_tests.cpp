@@ -6,6 +6,7 @@
 
 #include <cstdint>
 #include <limits>
+#include <vector>
 
 namespace {
 
@@ -44,6 +45,20 @@ TEST(BitPositions, FloatingClassesMustBeWholeAndFinite) {
     }
     EXPECT_TRUE(bitIsValid(64.0, 64));
     EXPECT_FALSE(bitIsValid(65.0f, 64));
+}
+
+// One bad position anywhere, block boundaries included, fails the array.
+TEST(BitPositions, ArrayScanFindsOneBadPositionAnywhere) {
+    std::vector<unsigned char> positions(3 * 4096 + 5);
+    for (std::size_t i = 0; i < positions.size(); ++i) positions[i] = i % 8 + 1;
+    EXPECT_TRUE(bitfcns::allPositionsValid(positions.data(), positions.size(), 8));
+    EXPECT_TRUE(bitfcns::allPositionsValid(positions.data(), 0, 8));
+    for (std::size_t bad : {0ul, 4095ul, 4096ul, 8193ul, positions.size() - 1}) {
+        positions[bad] = 9;
+        EXPECT_FALSE(bitfcns::allPositionsValid(positions.data(), positions.size(), 8)) << bad;
+        EXPECT_TRUE(bitfcns::allPositionsValid(positions.data(), bad, 8)) << bad;
+        positions[bad] = 8;
+    }
 }
 
 }  // namespace
