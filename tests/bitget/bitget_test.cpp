@@ -14,7 +14,6 @@
 #include <new>
 #include <random>
 #include <string>
-#include <tuple>
 #include <type_traits>
 #include <vector>
 
@@ -55,12 +54,16 @@ std::vector<T> randomValues(std::size_t n, std::uint64_t seed) {
     return values;
 }
 
-// Calls f(U{}) for each of the ten numeric classes of a position.
-template <class F>
-void forEachPositionClass(F f) {
-    std::apply([&](auto... tags) { (f(tags), ...); },
-               std::tuple<signed char, unsigned char, short, unsigned short, int, unsigned int,
-                          long, unsigned long, float, double>{});
+// The ten numeric classes a position may have.
+constexpr zqClassID positionClasses[] = {zqInt8Class,   zqUInt8Class,  zqInt16Class, zqUInt16Class,
+                                         zqInt32Class,  zqUInt32Class, zqInt64Class, zqUInt64Class,
+                                         zqSingleClass, zqDoubleClass};
+
+// Positions given as doubles, converted by the host to class `cls` (rounded
+// and saturated for the integer classes).
+zqArraySlot positionsOf(std::vector<double> values, zqClassID cls, host::Dims dims = {}) {
+    const auto doubles = makeOf(values, std::move(dims));
+    return zqArraySlot(matrix::convert_if_needed(doubles.get(), cls).detach());
 }
 
 template <class T>
@@ -80,12 +83,12 @@ TYPED_TEST(IntegerValues, EveryPositionClassReadsTheBitsOfTheValueClass) {
     using T = TypeParam;
     constexpr int width = widthOf<T>;
     const std::vector<T> values = randomValues<T>(2 * width, 1);
-    forEachPositionClass([&]<class U>(U) {
-        SCOPED_TRACE(testing::Message() << "position class " << classIdOf<U>);
-        std::vector<U> positions;
-        for (int i = 0; i < 2 * width; ++i) positions.push_back(static_cast<U>(i % width + 1));
-        const auto a = makeOf(values, {2, static_cast<unsigned long>(width)});
-        const auto p = makeOf(positions, {2, static_cast<unsigned long>(width)});
+    const auto a = makeOf(values, {2, static_cast<unsigned long>(width)});
+    std::vector<double> positions;
+    for (int i = 0; i < 2 * width; ++i) positions.push_back(i % width + 1);
+    for (zqClassID cls : positionClasses) {
+        SCOPED_TRACE(testing::Message() << "position class " << cls);
+        const auto p = positionsOf(positions, cls, {2, static_cast<unsigned long>(width)});
         const auto arrays = bitget({a.get(), p.get()});
         ASSERT_EQ(arrays.error, "");
         EXPECT_EQ(host::classOf(*arrays.result), classIdOf<T>);
@@ -95,8 +98,7 @@ TYPED_TEST(IntegerValues, EveryPositionClassReadsTheBitsOfTheValueClass) {
             ASSERT_EQ(bits[i], bitModel(values[i], i % width + 1)) << i;
 
         for (int position : {1, width / 2, width}) {
-            const auto one = scalarOf(static_cast<U>(position));
-            const auto scalar = bitget({a.get(), one.get()});
+            const auto scalar = bitget({a.get(), positionsOf({double(position)}, cls).get()});
             ASSERT_EQ(scalar.error, "");
             const auto got = elementsOf<T>(scalar.result.get());
             for (std::size_t i = 0; i < values.size(); ++i)
@@ -105,46 +107,42 @@ TYPED_TEST(IntegerValues, EveryPositionClassReadsTheBitsOfTheValueClass) {
 
         // A scalar value with positions: the result has the positions' sizes.
         const auto minimum = scalarOf(std::numeric_limits<T>::min());
-        const auto column = makeOf(positions, {static_cast<unsigned long>(2 * width), 1});
+        const auto column = positionsOf(positions, cls, {static_cast<unsigned long>(2 * width), 1});
         const auto spread = bitget({minimum.get(), column.get()});
         ASSERT_EQ(spread.error, "");
         EXPECT_EQ(host::dimensions(*spread.result), host::dimensions(*column));
         const auto signBits = elementsOf<T>(spread.result.get());
         for (std::size_t i = 0; i < signBits.size(); ++i)
             ASSERT_EQ(signBits[i], bitModel(std::numeric_limits<T>::min(), i % width + 1));
-    });
+    }
 }
 
 TYPED_TEST(IntegerValues, PositionsOutsideOneToTheWidthAreRefused) {
     using T = TypeParam;
-    constexpr int width = widthOf<T>;
+    constexpr double width = widthOf<T>;
     const auto a = flagged(makeOf<T>({1, 2, 3}));
-    forEachPositionClass([&]<class U>(U) {
-        SCOPED_TRACE(testing::Message() << "position class " << classIdOf<U>);
-        std::vector<U> bad{U(0), static_cast<U>(width + 1), static_cast<U>(127)};
-        if constexpr (std::is_signed_v<U>) bad.push_back(U(-1));
-        if constexpr (std::is_same_v<U, unsigned char>) bad.push_back(U(255));
-        if constexpr (std::is_floating_point_v<U>)
-            bad.insert(bad.end(), {U(1.5), U(width - 0.5), U(nan), U(inf), U(-inf)});
-        for (U position : bad) {
-            SCOPED_TRACE(testing::Message() << +position);
-            EXPECT_EQ(bitget({a.get(), scalarOf(position).get()}).error,
-                      "VESPRA:bitSetGet:BITOutOfRange");
+    const auto empty = makeOf<T>({}, {0, 3});
+    for (zqClassID cls : positionClasses) {
+        SCOPED_TRACE(testing::Message() << "position class " << cls);
+        // Negative values and NaN become 0 in the unsigned classes, 255 becomes
+        // 127 in int8; fractions survive only in single and double.
+        std::vector<double> bad{0, width + 1, 127, 255, -1, nan, inf, -inf};
+        if (cls == zqSingleClass || cls == zqDoubleClass) bad.insert(bad.end(), {1.5, width - 0.5});
+        for (double position : bad) {
+            SCOPED_TRACE(position);
+            const auto scalar = positionsOf({position}, cls);
+            EXPECT_EQ(bitget({a.get(), scalar.get()}).error, "VESPRA:bitSetGet:BITOutOfRange");
             // The last position of an array is read before any value is written.
-            const auto p = makeOf<U>({U(1), static_cast<U>(width), position});
+            const auto p = positionsOf({1, width, position}, cls);
             EXPECT_EQ(bitget({a.get(), p.get()}).error, "VESPRA:bitSetGet:BITOutOfRange");
             EXPECT_EQ(elementsOf<T>(a.get()), (std::vector<T>{1, 2, 3}));
             // A scalar position is tested even when there are no values.
-            const auto empty = makeOf<T>({}, {0, 3});
-            EXPECT_EQ(bitget({empty.get(), scalarOf(position).get()}).error,
-                      "VESPRA:bitSetGet:BITOutOfRange");
+            EXPECT_EQ(bitget({empty.get(), scalar.get()}).error, "VESPRA:bitSetGet:BITOutOfRange");
         }
-        const auto empty = makeOf<T>({}, {0, 3});
-        const auto noPositions = makeOf<U>({}, {0, 3});
-        const auto none = bitget({empty.get(), noPositions.get()});
+        const auto none = bitget({empty.get(), positionsOf({}, cls, {0, 3}).get()});
         ASSERT_EQ(none.error, "");
         EXPECT_EQ(host::dimensions(*none.result), (host::Dims{0, 3}));
-    });
+    }
 }
 
 // Below and at each parallel limit, fresh and in place, the bits agree with
