@@ -188,7 +188,8 @@ TEST(DoubleValues, SerialAndParallelRunsAgree) {
             positions[i] = static_cast<double>(i % 16 + 1);
         }
         const auto expected = [&](double v, double p) {
-            return double((static_cast<std::uint16_t>(v) >> (static_cast<int>(p) - 1)) & 1);
+            return double(
+                (static_cast<std::uint16_t>(static_cast<int>(v)) >> (static_cast<int>(p) - 1)) & 1);
         };
         const auto int16 = text(u"int16");
         const auto p = makeOf(positions);
