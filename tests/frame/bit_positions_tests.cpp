@@ -47,18 +47,30 @@ TEST(BitPositions, FloatingClassesMustBeWholeAndFinite) {
     EXPECT_FALSE(bitIsValid(65.0f, 64));
 }
 
-// One bad position anywhere, block boundaries included, fails the array.
+// One bad position anywhere, block boundaries and an unaligned start
+// included, fails the array.
 TEST(BitPositions, ArrayScanFindsOneBadPositionAnywhere) {
-    std::vector<unsigned char> positions(3 * 4096 + 5);
-    for (std::size_t i = 0; i < positions.size(); ++i) positions[i] = i % 8 + 1;
-    EXPECT_TRUE(bitfcns::allPositionsValid(positions.data(), positions.size(), 8));
-    EXPECT_TRUE(bitfcns::allPositionsValid(positions.data(), 0, 8));
-    for (std::size_t bad : {0ul, 4095ul, 4096ul, 8193ul, positions.size() - 1}) {
-        positions[bad] = 9;
-        EXPECT_FALSE(bitfcns::allPositionsValid(positions.data(), positions.size(), 8)) << bad;
-        EXPECT_TRUE(bitfcns::allPositionsValid(positions.data(), bad, 8)) << bad;
-        positions[bad] = 8;
-    }
+    const auto scan = []<class U>(std::vector<U> positions, std::vector<U> badValues) {
+        for (std::size_t i = 0; i < positions.size(); ++i) positions[i] = U(i % 8 + 1);
+        for (std::size_t start : {0ul, 1ul}) {
+            const U* first = positions.data() + start;
+            const std::size_t n = positions.size() - start;
+            EXPECT_TRUE(bitfcns::allPositionsValid(first, n, 8));
+            EXPECT_TRUE(bitfcns::allPositionsValid(first, 0, 8));
+            for (std::size_t bad : {0ul, 1ul, 4095ul, 4096ul, 8193ul, n - 2, n - 1})
+                for (U value : badValues) {
+                    const U kept = first[bad];
+                    positions[start + bad] = value;
+                    EXPECT_FALSE(bitfcns::allPositionsValid(first, n, 8)) << bad << ": " << +value;
+                    EXPECT_TRUE(bitfcns::allPositionsValid(first, bad, 8)) << bad;
+                    positions[start + bad] = kept;
+                }
+        }
+    };
+    scan(std::vector<unsigned char>(3 * 4096 + 5), {0, 9});
+    scan(std::vector<double>(3 * 4096 + 5),
+         {0.0, 9.0, 1.5, -1.0, std::numeric_limits<double>::quiet_NaN(),
+          std::numeric_limits<double>::infinity(), 4294967297.0});
 }
 
 }  // namespace
