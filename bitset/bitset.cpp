@@ -2,17 +2,10 @@
 // class double to the double path and settles V and the assumed type for
 // the integer path.
 #include "bitfcns/entry_points.hpp"
-#include "bitset/bit_checks.hpp"
 #include "bitset/bitset_paths.hpp"
 #include "frame/exception.hpp"
 #include "frame/message_tags.hpp"
 #include "frame/scalar_text.hpp"
-
-namespace bitfcns {
-
-void raiseBitOutOfRange() { raiseError<VESPRA::bitSetGet::BITOutOfRange>(); }
-
-}  // namespace bitfcns
 
 void ondelBitSetFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
     using namespace bitfcns;

@@ -39,11 +39,13 @@ BitMask<T> maskAt(std::uint32_t bitIndex) noexcept {
     return BitMask<T>{1} << bitIndex;
 }
 
-// The bits of `word` with those of `mask` set or cleared, cut to T.
+// The bits of `word` with those of `mask` set or cleared, cut to T; without
+// a branch, since `set` may change from one element to the next.
 template <class T>
 T withMask(T word, BitMask<T> mask, bool set) noexcept {
     const auto bits = static_cast<BitMask<T>>(word);
-    return static_cast<T>(set ? (bits | mask) : (bits & ~mask));
+    const auto setBits = static_cast<BitMask<T>>(mask & (BitMask<T>{0} - BitMask<T>{set}));
+    return static_cast<T>((bits & ~mask) | setBits);
 }
 
 // A V element is true when it isn't zero in its own type: 256 in an int16 is
