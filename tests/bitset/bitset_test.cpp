@@ -4,6 +4,7 @@
 // array left behind. The call forms, the truth of V and the refusals are in
 // bitset.case.
 #include "bitfcns/entry_points.hpp"
+#include "bitset/bitset_functors.hpp"
 #include "engine/parallel_limits.hpp"
 #include "host/array_factory.hpp"
 #include "host/host_control.hpp"
@@ -82,6 +83,28 @@ TEST(Bitset, EveryClassCombinationReachesItsKernel) {
                                   withBit(bitsAt(a.get(), i), b, set, widthOf(aClass)));
                     }
                 }
+}
+
+// The double path's functor agrees with the integer path's in every class:
+// a double holding a value of T, with the top bit, the lowest or another set
+// or cleared, comes back as the double nearest to the new value of T.
+template <class T>
+class DoubleFunctor : public ::testing::Test {};
+using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                      unsigned int, long, unsigned long>;
+TYPED_TEST_SUITE(DoubleFunctor, IntegerTypes);
+
+TYPED_TEST(DoubleFunctor, AgreesWithTheIntegerFunctor) {
+    using T = TypeParam;
+    constexpr int width = sizeof(T) * 8;
+    // All ones, except in uint64, where no double holds it.
+    const T ones = T(std::is_signed_v<T> || width < 64 ? -1 : 5);
+    for (T a : {T(0), T(1), ones, std::numeric_limits<T>::min(), T(T(1) << (width - 2))})
+        for (int b : {1, 2, width - 1, width})
+            for (bool v : {false, true})
+                EXPECT_EQ(bitfcns::BitsetFtor<T>{}(static_cast<double>(a), b, v),
+                          static_cast<double>(bitfcns::bitsetVVVFtor<T, bool>{}(a, b, v)))
+                    << +a << " " << b << " " << v;
 }
 
 // 0, 1, the width and one past it, -1 and 2^40 in every class, and the odd
