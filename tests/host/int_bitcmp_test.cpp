@@ -30,7 +30,9 @@ TYPED_TEST(IntVectorBitcmpTest, CountsAndMisalignmentsLeaveTheSentinels) {
                 ASSERT_EQ(out[offset + i], static_cast<T>(~in[offset + i]))
                     << count << " " << offset;
             ASSERT_EQ(out[offset + count], sentinel);
-            if (offset > 0) ASSERT_EQ(out[offset - 1], sentinel);
+            if (offset > 0) {
+                ASSERT_EQ(out[offset - 1], sentinel);
+            }
         }
     }
 }

@@ -97,7 +97,9 @@ TYPED_TEST(BitLogicTest, FailuresLeaveTheSlotAndReleaseConversions) {
             error = "bad_alloc";
         }
         host::failNextAllocations(0);
-        if (!error.empty()) EXPECT_EQ(slot.get(), before) << "a refused call replaced the slot";
+        if (!error.empty()) {
+            EXPECT_EQ(slot.get(), before) << "a refused call replaced the slot";
+        }
         return error;
     };
     // The second operand fails after the first was converted.
