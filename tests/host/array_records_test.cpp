@@ -28,9 +28,13 @@ TEST_F(ArrayRecordTest, SizesAreNormalisedTheWayTheHostShowsThem) {
     }
 }
 
+// Only sizes none of which is 0 can overflow the byte count.
 TEST_F(ArrayRecordTest, CreationRefusesASizeWhoseByteCountOverflows) {
     EXPECT_FALSE(create({1UL << 40, 1UL << 40}));
     EXPECT_FALSE(create({1UL << 61}));
+    const zqArraySlot empty = create({1UL << 62, 1UL << 62, 0});
+    ASSERT_TRUE(empty);
+    EXPECT_EQ(host::elementCount(*empty), 0u);
 }
 
 // In-place results rely on a shared copy staying valid whichever record
