@@ -3,8 +3,8 @@
 // array left behind or operand touched by a refused call or a failed
 // allocation. Values, classes and the order of refusals are in the golden
 // case file bitcmp.case.
+#include "bitcmp/bitcmp_ftor.hpp"
 #include "bitfcns/entry_points.hpp"
-#include "engine/parallel_limits.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
 
@@ -29,7 +29,8 @@ class Bitcmp : public LeakCheckedTest {};
 
 // One below the parallel limit and at it give the same bits.
 TEST_F(Bitcmp, SerialAndParallelRunsAgree) {
-    for (unsigned long n : {bitfcns::limits::bitcmpOnDouble - 1, bitfcns::limits::bitcmpOnDouble}) {
+    const unsigned long limit = bitfcns::BitcmpFtor<unsigned short>::parallelLimit;
+    for (unsigned long n : {limit - 1, limit}) {
         std::vector<double> values(n);
         for (unsigned long i = 0; i < n; ++i) values[i] = static_cast<double>((i * 7919) % 65536);
         const auto operand = makeOf(values);
