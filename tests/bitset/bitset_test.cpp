@@ -90,8 +90,6 @@ TEST(Bitset, EveryClassCombinationReachesItsKernel) {
 // or cleared, comes back as the double nearest to the new value of T.
 template <class T>
 class DoubleFunctor : public ::testing::Test {};
-using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
-                                      unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(DoubleFunctor, IntegerTypes);
 
 TYPED_TEST(DoubleFunctor, AgreesWithTheIntegerFunctor) {
