@@ -104,6 +104,35 @@ TEST_F(ArrayRecordTest, SharedCopyKeepsSizesBehindAPointerAndTheImaginaryPart) {
     EXPECT_EQ(imaginaryData(*copy), imaginaryData(*source));
 }
 
+// The lender gets its elements back once, when the last record reading them
+// goes, whichever that is; a record that can't be made gives them back too.
+TEST_F(ArrayRecordTest, LentElementsAreReadInPlaceAndGivenBackOnce) {
+    struct Lender {
+        int returns = 0;
+        static void giveBack(void* owner) noexcept { ++static_cast<Lender*>(owner)->returns; }
+    };
+    std::vector<short> elements{1, 2, 3, 4, 5, 6};
+    const unsigned long dims[] = {3, 2, 1};
+    Lender lender;
+    zqArraySlot lent =
+        makeArrayOverLentElements(zqInt16Class, dims, {elements.data(), &lender, Lender::giveBack});
+    EXPECT_EQ(lent->data, elements.data());
+    EXPECT_EQ(dimensions(*lent), (Dims{3, 2}));
+    EXPECT_TRUE(lent->flags & zqNumericFlag);
+    zqArraySlot copy(shared_copy(lent.get()));
+    EXPECT_EQ(copy->data, elements.data());
+    lent.reset();
+    EXPECT_EQ(lender.returns, 0);
+    copy.reset();
+    EXPECT_EQ(lender.returns, 1);
+
+    failNextAllocations(1);
+    EXPECT_THROW(
+        makeArrayOverLentElements(zqLogicalClass, {}, {elements.data(), &lender, Lender::giveBack}),
+        std::bad_alloc);
+    EXPECT_EQ(lender.returns, 2);
+}
+
 TEST_F(ArrayRecordTest, ReferencesFromConversionKeepTheArrayAlive) {
     zqArraySlot array = makeDoubleScalar(4);
     boost::intrusive_ptr<zqArray_tag> same = matrix::convert_if_needed(array.get(), zqDoubleClass);
