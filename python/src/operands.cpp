@@ -39,7 +39,17 @@ struct HostDims {
     std::span<const unsigned long> span() const { return {sizes.data(), std::size_t(count)}; }
 };
 
+// A masked array would lose its mask on the way: refused rather than read
+// as its bare data. Other subclasses of ndarray are read as arrays.
+bool isMaskedArray(PyObject* array) {
+    if (PyArray_CheckExact(array)) return false;
+    static PyObject* const maskedArrayType =
+        py::object(py::module_::import("numpy.ma").attr("MaskedArray")).release().ptr();
+    return PyObject_IsInstance(array, maskedArrayType) == 1;
+}
+
 std::string describe(PyObject* object) {
+    if (isMaskedArray(object)) return "a masked array";
     if (PyArray_Check(object)) {
         const py::str dtype(reinterpret_cast<PyObject*>(PyArray_DESCR((PyArrayObject*)object)));
         return "an array of dtype " + dtype.cast<std::string>();
@@ -160,15 +170,6 @@ zqArraySlot textArray(PyObject* text) {
         }
     }
     return host::makeCharArray(units);
-}
-
-// A masked array would lose its mask on the way: refused rather than read
-// as its bare data. Other subclasses of ndarray are read as arrays.
-bool isMaskedArray(PyObject* array) {
-    if (PyArray_CheckExact(array)) return false;
-    static PyObject* const maskedArrayType =
-        py::object(py::module_::import("numpy.ma").attr("MaskedArray")).release().ptr();
-    return PyObject_IsInstance(array, maskedArrayType) == 1;
 }
 
 bool overlaps(const Operand& a, const Operand& b) {
