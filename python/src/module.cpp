@@ -8,6 +8,7 @@
 #include "docstrings.hpp"
 #include "errors.hpp"
 #include "library_functions.hpp"
+#include "operands.hpp"
 
 #include <pybind11/pybind11.h>
 
@@ -53,6 +54,7 @@ PYBIND11_MODULE(_core, module) {
     using namespace bitfcns::python;
     if (_import_array() < 0) throw py::error_already_set();
     setBitfcnsErrorClass(py::module_::import("bitfcns._errors").attr("BitfcnsError").ptr());
+    prepareOperands();
 
     static std::array<PyMethodDef, kFunctionCount + 1> methods =
         methodTable(std::make_index_sequence<kFunctionCount>());

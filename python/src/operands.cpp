@@ -39,13 +39,12 @@ struct HostDims {
     std::span<const unsigned long> span() const { return {sizes.data(), std::size_t(count)}; }
 };
 
+PyObject* maskedArrayType = nullptr;
+
 // A masked array would lose its mask on the way: refused rather than read
 // as its bare data. Other subclasses of ndarray are read as arrays.
-bool isMaskedArray(PyObject* array) {
-    if (PyArray_CheckExact(array)) return false;
-    static PyObject* const maskedArrayType =
-        py::object(py::module_::import("numpy.ma").attr("MaskedArray")).release().ptr();
-    return PyObject_IsInstance(array, maskedArrayType) == 1;
+bool isMaskedArray(PyObject* object) {
+    return !PyArray_CheckExact(object) && PyObject_IsInstance(object, maskedArrayType) == 1;
 }
 
 std::string describe(PyObject* object) {
@@ -177,6 +176,12 @@ bool overlaps(const Operand& a, const Operand& b) {
 }
 
 }  // namespace
+
+void prepareOperands() {
+    // Imported here, once, with the GIL held: never inside a call.
+    maskedArrayType =
+        py::object(py::module_::import("numpy.ma").attr("MaskedArray")).release().ptr();
+}
 
 Operand toOperand(PyObject* object, std::string_view function, int position) {
     Operand operand;

@@ -29,6 +29,9 @@ struct Operand {
     bool mayTakeOver = false;
 };
 
+// Looks up what the conversions need of NumPy; once, when the module loads.
+void prepareOperands();
+
 // The host array for `object`, the `position`th operand (from 1) of
 // `function`. Raises a pybind11 TypeError naming what was given and what is
 // accepted, or a ValueError for an int that no double holds exactly; the
