@@ -192,6 +192,7 @@ def _verdict(*faults: tuple | None) -> None:
 
 
 def _result_of(outcome: _Outcome, verdict: None) -> np.ndarray:
+    assert outcome.result is not None  # the verdict has passed every chunk
     return outcome.result
 
 
