@@ -29,7 +29,7 @@ void returnLentArray(void* owner) noexcept {
 
 // NumPy's shape reversed: the host's column-major sizes of a C-ordered array.
 struct HostDims {
-    std::array<unsigned long, NPY_MAXDIMS> sizes{};
+    std::array<unsigned long, NPY_MAXDIMS> sizes;  // the first `count` set, no more
     int count = 0;
 
     explicit HostDims(PyArrayObject* array) : count(PyArray_NDIM(array)) {

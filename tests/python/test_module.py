@@ -137,6 +137,20 @@ def test_overwrite_input_takes_over_a_writeable_c_ordered_operand_only():
         np.testing.assert_array_equal(result, ~original)
 
 
+@pytest.mark.needs("bitshift")
+def test_an_operand_reading_the_first_shifted_keeps_it_from_being_taken_over():
+    values = np.arange(40001, dtype=np.int32) % 7  # beyond the parallel limits
+    expected = values[:-1] << values[1:]
+    first = values[:-1]
+    result = bitfcns.bitshift(first, values[1:], overwrite_input=True)
+    assert not np.shares_memory(result, first)
+    np.testing.assert_array_equal(result, expected)
+    same = values.copy()
+    result = bitfcns.bitshift(same, same, overwrite_input=True)  # each element read before written
+    assert np.shares_memory(result, same)
+    np.testing.assert_array_equal(result, values << values)
+
+
 def test_results_and_operands_outlive_each_other():
     a = np.arange(100000, dtype=np.int64)
     references = sys.getrefcount(a)
