@@ -15,9 +15,10 @@ A call is refused exactly as one call on the whole arrays would be:
 
 - Refusals that depend on dtypes, shapes and the type name are raised at
   once, when the Dask array is made, by the library itself: it is called on
-  small stand-ins of the operands, with the same dtypes, the same sizes where
-  a size is 0 or 1 and equal sizes where sizes are equal, and values that
-  pass every test.
+  small stand-ins of the operands, with the same types and dtypes, the same
+  sizes where a size is 0 or 1 and equal sizes where sizes are equal, and
+  values that pass every test. Scalars are stand-ins too, so that a bad
+  scalar is reported after the bad values of an earlier operand.
 - Refusals of values (a double that its type can't hold, a bit position or
   shift count out of range) are raised when the result is computed. The
   library tests all values of the first operand before any position or
@@ -253,23 +254,29 @@ def _released_after_verdict(outcomes: da.Array, name: str, meta: np.ndarray) -> 
 
 
 def _stand_ins(operands: Sequence[Any]) -> list[Any]:
-    """Small operands that the library treats as it treats ``operands`` up to
-    the values: each array becomes ones of its dtype whose sizes keep 0 and 1
-    and map the other sizes met in one dimension (counted from the last, as
-    NumPy broadcasting aligns them) to 2, 3, ... in order."""
+    """Operands that the library treats as it treats ``operands`` up to the
+    values, which all pass every test: ones of the same type or dtype, and for
+    each array ones whose sizes keep 0 and 1 and map the other sizes met in
+    one dimension (counted from the last, as NumPy broadcasting aligns them)
+    to 2, 3, ... in order. A type name stays as it is."""
     arrays = [operand for operand in operands if isinstance(operand, da.Array)]
     ndim = max((array.ndim for array in arrays), default=0)
     small_sizes = []
     for axis in range(1, ndim + 1):
         met = sorted({a.shape[-axis] for a in arrays if a.ndim >= axis} - {0, 1})
         small_sizes.append({size: 2 + rank for rank, size in enumerate(met)})
-    stand_ins = []
+    stand_ins: list[Any] = []
     for operand in operands:
         if isinstance(operand, da.Array):
             shape = tuple(
                 small_sizes[operand.ndim - 1 - i].get(size, size)
                 for i, size in enumerate(operand.shape)
             )
-            operand = np.ones(shape, dtype=operand.dtype)
-        stand_ins.append(operand)
+            stand_ins.append(np.ones(shape, dtype=operand.dtype))
+        elif isinstance(operand, (np.ndarray, np.generic)):
+            stand_ins.append(np.ones_like(operand))
+        elif isinstance(operand, (bool, int, float)):
+            stand_ins.append(type(operand)(1))
+        else:
+            stand_ins.append(operand)  # a type name, or what the library refuses
     return stand_ins

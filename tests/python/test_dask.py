@@ -77,12 +77,14 @@ def values_before_counts(a, count):
 
 
 @pytest.mark.parametrize("scheduler", ["sync", "threads"])
-def test_the_earliest_operand_with_a_fault_decides_whichever_chunk_fails_first(scheduler):
+@pytest.mark.parametrize("bad_counts", ["first chunks", "scalar"])
+def test_the_earliest_operand_with_a_fault_decides_whichever_chunk_fails_first(scheduler, bad_counts):
     values = np.ones(40)
-    counts = np.ones(40)
-    counts[:5] = -1  # the first chunks have bad counts
     values[-1] = -1  # the last chunk has a bad value
-    lazy = bd._apply(values_before_counts, (chunked(values, 5), chunked(counts, 5)))
+    counts = np.ones(40)
+    counts[:5] = -1
+    count_operand = chunked(counts, 5) if bad_counts == "first chunks" else -1.0
+    lazy = bd._apply(values_before_counts, (chunked(values, 5), count_operand))
     with pytest.raises(BitfcnsError) as raised:
         lazy.compute(scheduler=scheduler)
     assert raised.value.identifier == "VESPRA:bitshift:outOfRange"
