@@ -17,6 +17,8 @@ INTEGER_DTYPES = ["int8", "uint8", "int16", "uint16", "int32", "uint32", "int64"
 
 def pytest_configure(config):
     config.addinivalue_line("markers", "needs(*names): skip unless the library has these functions")
+    # Debian's distributed on Debian's tornado.
+    config.addinivalue_line("filterwarnings", "ignore:make_current is deprecated:DeprecationWarning")
 
 
 def pytest_runtest_setup(item):
