@@ -5,6 +5,7 @@
 #include "element_classes.hpp"
 
 #include "host/array_factory.hpp"
+#include "host/exceptions.hpp"
 
 #include <pybind11/pybind11.h>
 
@@ -171,6 +172,17 @@ zqArraySlot textArray(PyObject* text) {
     return host::makeCharArray(units);
 }
 
+// A 1-by-1 array holding `value`, made the way the library makes its results:
+// the host's makers for scalars cost a vector of sizes a call.
+template <class T>
+zqArraySlot scalarArray(zqClassID cls, T value) {
+    static constexpr unsigned long kOneByOne[] = {1, 1};
+    zqArraySlot array(matrix::detail::create_uninitnumeric(2, kOneByOne, cls, zqReal, 0, nullptr));
+    if (!array) throw foundation::core::except::bad_alloc();
+    *static_cast<T*>(array->data) = value;
+    return array;
+}
+
 bool overlaps(const Operand& a, const Operand& b) {
     return a.lentBegin < b.lentEnd && b.lentBegin < a.lentEnd;
 }
@@ -186,14 +198,14 @@ void prepareOperands() {
 Operand toOperand(PyObject* object, std::string_view function, int position) {
     Operand operand;
     if (PyBool_Check(object)) {
-        operand.array = host::makeLogicalScalar(object == Py_True);
+        operand.array = scalarArray(zqLogicalClass, object == Py_True);
     } else if (PyUnicode_Check(object)) {
         operand.array = textArray(object);
         operand.isText = true;
     } else if (PyFloat_Check(object)) {
-        operand.array = host::makeDoubleScalar(PyFloat_AS_DOUBLE(object));
+        operand.array = scalarArray(zqDoubleClass, PyFloat_AS_DOUBLE(object));
     } else if (PyLong_Check(object)) {
-        operand.array = host::makeDoubleScalar(exactDouble(object, function, position));
+        operand.array = scalarArray(zqDoubleClass, exactDouble(object, function, position));
     } else if (PyArray_Check(object) && !isMaskedArray(object)) {
         return arrayOperand(reinterpret_cast<PyArrayObject*>(object), function, position);
     } else if (PyArray_IsScalar(object, Generic)) {
