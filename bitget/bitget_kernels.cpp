@@ -8,11 +8,11 @@
 #include "engine/operator_families.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/array.hpp"
-#include "frame/bit_positions.hpp"
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
 #include "frame/message_tags.hpp"
+#include "frame/position_scan.hpp"
 
 #include <cstdint>
 #include <type_traits>

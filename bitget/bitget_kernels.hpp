@@ -3,7 +3,7 @@
 // for one class in each of its eight compilations.
 #pragma once
 
-#include "host/zq_array.hpp"
+#include "frame/array.hpp"
 
 namespace bitfcns {
 
