@@ -7,6 +7,7 @@
 #include "bitfcns/entry_points.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
+#include "tests/support/whole_values.hpp"
 
 #include <new>
 
@@ -26,6 +27,16 @@ zqArraySlot flaggedForSharing(zqArraySlot array) {
 }
 
 class Bitcmp : public LeakCheckedTest {};
+
+template <class T>
+class DoubleLanes : public ::testing::Test {};
+TYPED_TEST_SUITE(DoubleLanes, IntegerTypes);
+
+// The complement in registers is the functor's to the last bit.
+TYPED_TEST(DoubleLanes, AgreeWithTheFunctor) {
+    expectLanesAgree<TypeParam>(bitfcns::BitcmpLanes<TypeParam>{},
+                                bitfcns::BitcmpFtor<TypeParam>{});
+}
 
 // One below the parallel limit and at it give the same bits.
 TEST_F(Bitcmp, SerialAndParallelRunsAgree) {

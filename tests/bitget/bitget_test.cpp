@@ -4,9 +4,11 @@
 // a refused call leaves. Results and refusals seen from outside are in
 // tests/golden/bitget.case.
 #include "bitfcns/entry_points.hpp"
+#include "bitget/bitget_ftors.hpp"
 #include "host/array_factory.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
+#include "tests/support/whole_values.hpp"
 
 #include <gtest/gtest.h>
 
@@ -79,6 +81,14 @@ private:
 using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
                                       unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(IntegerValues, IntegerTypes);
+
+// Doubles at one position, in registers, read the functor's bit.
+TYPED_TEST(IntegerValues, DoubleLanesAgreeWithTheFunctor) {
+    using T = TypeParam;
+    for (int p = 1; p <= int(sizeof(T) * 8); ++p)
+        expectLanesAgree<T>(bitfcns::BitgetLanes<T>(unsigned(p - 1)),
+                            [p](double x) { return bitfcns::BitgetFtor<T>{}(x, p); });
+}
 
 TYPED_TEST(IntegerValues, EveryPositionClassReadsTheBitsOfTheValueClass) {
     using T = TypeParam;

@@ -9,6 +9,7 @@
 #include "host/array_factory.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
+#include "tests/support/whole_values.hpp"
 
 #include <gtest/gtest.h>
 
@@ -106,6 +107,18 @@ TYPED_TEST(DoubleFunctor, AgreesWithTheIntegerFunctor) {
                 EXPECT_EQ(bitfcns::BitsetFtor<T>{}(static_cast<double>(a), b, v),
                           static_cast<double>(bitfcns::bitsetVVVFtor<T, bool>{}(a, b, v)))
                     << +a << " " << b << " " << v;
+}
+
+// With one position and one V, in registers, as the functor does.
+TYPED_TEST(DoubleFunctor, LanesAgreeWithTheFunctor) {
+    using T = TypeParam;
+    for (unsigned index = 0; index < sizeof(T) * 8; ++index) {
+        const double b = index + 1;
+        expectLanesAgree<T>(bitfcns::BitsetLanes<T, true>(index),
+                            [b](double a) { return bitfcns::BitsetFtor<T>{}(a, b, true); });
+        expectLanesAgree<T>(bitfcns::BitsetLanes<T, false>(index),
+                            [b](double a) { return bitfcns::BitsetFtor<T>{}(a, b, false); });
+    }
 }
 
 // 0, 1, the width and one past it, -1 and 2^40 in every class, and the odd

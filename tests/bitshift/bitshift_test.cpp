@@ -5,10 +5,12 @@
 // failures that leave nothing behind. The order of refusals is in the
 // golden case file.
 #include "bitfcns/entry_points.hpp"
+#include "bitshift/shift_rule.hpp"
 #include "engine/parallel_limits.hpp"
 #include "host/array_factory.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
+#include "tests/support/whole_values.hpp"
 
 #include <gtest/gtest.h>
 
@@ -153,6 +155,26 @@ void checkAgainstReference(const std::vector<T>& values, const std::vector<U>& c
         for (std::size_t i = 0; i < values.size(); ++i)
             ASSERT_EQ(result[i], referenceShift(values[i], counts[counts.size() == 1 ? 0 : i]))
                 << "element " << i << " of " << values.size() << (inPlace ? ", in place" : "");
+    }
+}
+
+// Doubles by one count, in registers, as the functor shifts them: every
+// count within the width and one beyond it each way.
+TYPED_TEST(EveryValueClass, DoubleLanesAgreeWithTheFunctor) {
+    using T = TypeParam;
+    using bitfcns::DoubleShift;
+    const auto agree = [](auto kernel, double c) {
+        expectLanesAgree<T>(kernel, [c](double x) { return bitfcns::BitshiftFtor<T>{}(x, c); });
+    };
+    constexpr double width = sizeof(T) * 8;
+    for (double c = -width - 1; c <= width + 1; ++c) {
+        if (std::fabs(c) >= width) {
+            agree(bitfcns::BitshiftLanes<T, DoubleShift::out>(c), c);
+        } else if (c > 0) {
+            agree(bitfcns::BitshiftLanes<T, DoubleShift::left>(c), c);
+        } else {
+            agree(bitfcns::BitshiftLanes<T, DoubleShift::right>(c), c);
+        }
     }
 }
 

@@ -1,11 +1,17 @@
 // bitand, bitor and bitxor through their entry points: the order of tests
-// between two faults, and what a refused or failing call leaves behind. The
-// class pairs, sizes and values are in the golden case file bit_logic.case.
+// between two faults, what a refused or failing call leaves behind, and
+// doubles taken for every integer class against the integer path. The class
+// pairs, sizes and values are in the golden case file bit_logic.case.
 #include "bitfcns/entry_points.hpp"
+#include "frame/integer_conversion.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
+#include "tests/support/whole_values.hpp"
 
+#include <algorithm>
+#include <bit>
 #include <new>
+#include <string>
 
 namespace {
 
@@ -115,6 +121,42 @@ TYPED_TEST(BitLogicTest, FailuresLeaveTheSlotAndReleaseConversions) {
         EXPECT_EQ(error, "bad_alloc") << "after " << successes << " allocations";
     }
     EXPECT_GE(successes, 4u);
+}
+
+// Two double arrays, and an array with a double scalar, taken for class T,
+// give the integer path's elements on the same values, as doubles to the
+// last bit.
+template <class T>
+void expectDoublesMatchIntegers(EntryPoint entry) {
+    constexpr const char16_t* names[] = {u"int8",  u"uint8",  u"int16", u"uint16",
+                                         u"int32", u"uint32", u"int64", u"uint64"};
+    const auto name = host::makeCharArray(names[classIdOf<T> - zqInt8Class]);
+    const std::vector<double> x = wholeValuesOf<T>();
+    std::vector<double> y(x.rbegin(), x.rend());
+    std::vector<T> xs(x.size()), ys(x.size());
+    std::transform(x.begin(), x.end(), xs.begin(), bitfcns::wholeDoubleTo<T>);
+    std::transform(y.begin(), y.end(), ys.begin(), bitfcns::wholeDoubleTo<T>);
+    const auto expectSame = [&](const zqArray_tag* a, const zqArray_tag* b, const zqArray_tag* ai,
+                                const zqArray_tag* bi) {
+        const auto doubles = callEntry(entry, {a, b, name.get()});
+        const auto integers = callEntry(entry, {ai, bi});
+        ASSERT_EQ(doubles.error + integers.error, "");
+        const auto got = elementsOf<double>(doubles.result.get());
+        const auto want = elementsOf<T>(integers.result.get());
+        ASSERT_EQ(got.size(), want.size());
+        for (std::size_t i = 0; i < got.size(); ++i)
+            ASSERT_EQ(std::bit_cast<std::uint64_t>(got[i]),
+                      std::bit_cast<std::uint64_t>(bitfcns::integerToDouble(want[i])))
+                << i << ": " << x[i] << ", " << y[i];
+    };
+    expectSame(makeOf(x).get(), makeOf(y).get(), makeOf(xs).get(), makeOf(ys).get());
+    expectSame(makeOf(x).get(), scalarOf(y[3]).get(), makeOf(xs).get(), scalarOf(ys[3]).get());
+}
+
+TYPED_TEST(BitLogicTest, DoublesAgreeWithTheIntegerPathInEveryClass) {
+    [&]<class... T>(::testing::Types<T...>) {
+        (expectDoublesMatchIntegers<T>(TypeParam::entry), ...);
+    }(IntegerTypes{});
 }
 
 }  // namespace
