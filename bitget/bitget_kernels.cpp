@@ -5,6 +5,7 @@
 #include "bitget/bitget_kernels.hpp"
 
 #include "bitget/bitget_ftors.hpp"
+#include "bitget/bitget_wide.hpp"
 #include "engine/operator_families.hpp"
 #include "engine/parallel_driver.hpp"
 #include "engine/vector_ops.hpp"
@@ -13,6 +14,7 @@
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
+#include "frame/lane_width.hpp"
 #include "frame/message_tags.hpp"
 #include "frame/position_scan.hpp"
 
@@ -77,8 +79,9 @@ void bitgetFloatingPositions(T* out, const T* in, const U* positions, unsigned l
 template <class T>
 bool getBitsAtOnePosition(const double* x, double p, double* out, unsigned long n) {
     if (!bitIsValid(p, bitWidth<T>)) return false;
-    const BitgetLanes<T> kernel(static_cast<unsigned>(static_cast<int>(p) - 1));
-    return runCheckedLanes(kernel, x, nullptr, out, n, &runInRanges);
+    const auto index = static_cast<unsigned>(static_cast<int>(p) - 1);
+    if (laneWidth() == LaneWidth::avx512) return getBitWide<T>(x, index, out, n);
+    return runCheckedLanes(BitgetLanes<T>(index), x, nullptr, out, n, &runInRanges);
 }
 
 }  // namespace

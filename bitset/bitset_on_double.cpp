@@ -5,6 +5,7 @@
 #include "bitset/bit_checks.hpp"
 #include "bitset/bitset_functors.hpp"
 #include "bitset/bitset_paths.hpp"
+#include "bitset/bitset_wide.hpp"
 #include "bitset/result_shape.hpp"
 #include "engine/parallel_driver.hpp"
 #include "engine/vector_ops.hpp"
@@ -14,6 +15,7 @@
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
+#include "frame/lane_width.hpp"
 #include "frame/message_tags.hpp"
 #include "frame/scalar_text.hpp"
 
@@ -31,6 +33,7 @@ bool setAtOnePosition(const double* values, double position, bool value, double*
                       unsigned long n) {
     if (!bitIsValid(position, bitWidth<T>)) return false;
     const std::uint32_t index = bitIndexOf(position);
+    if (laneWidth() == LaneWidth::avx512) return setBitWide<T>(values, index, value, out, n);
     if (value)
         return runCheckedLanes(BitsetLanes<T, true>(index), values, nullptr, out, n, &runInRanges);
     return runCheckedLanes(BitsetLanes<T, false>(index), values, nullptr, out, n, &runInRanges);

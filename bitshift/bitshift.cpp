@@ -14,6 +14,7 @@
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
+#include "frame/lane_width.hpp"
 #include "frame/message_tags.hpp"
 
 #include <cmath>
@@ -72,8 +73,17 @@ bool shiftByOneCount(const double* values, double count, double* out, unsigned l
         return runCheckedLanes(kernel, values, nullptr, out, n, &runInRanges);
     };
     constexpr double width = bitWidth<T>;
-    if (!(std::fabs(count) < width)) return run(BitshiftLanes<T, DoubleShift::out>(count));
-    if (count > 0) return run(BitshiftLanes<T, DoubleShift::left>(count));
+    const bool wide = laneWidth() == LaneWidth::avx512;
+    if (!(std::fabs(count) < width)) {
+        if (wide) return shiftWide<T>(values, DoubleShift::out, count < 0 ? -1 : 1, out, n);
+        return run(BitshiftLanes<T, DoubleShift::out>(count));
+    }
+    const int k = static_cast<int>(count);
+    if (k > 0) {
+        if (wide) return shiftWide<T>(values, DoubleShift::left, k, out, n);
+        return run(BitshiftLanes<T, DoubleShift::left>(count));
+    }
+    if (wide) return shiftWide<T>(values, DoubleShift::right, -k, out, n);
     return run(BitshiftLanes<T, DoubleShift::right>(count));
 }
 

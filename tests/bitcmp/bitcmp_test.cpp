@@ -29,13 +29,12 @@ zqArraySlot flaggedForSharing(zqArraySlot array) {
 class Bitcmp : public LeakCheckedTest {};
 
 template <class T>
-class DoubleLanes : public ::testing::Test {};
-TYPED_TEST_SUITE(DoubleLanes, IntegerTypes);
+class DoubleValues : public ::testing::Test {};
+TYPED_TEST_SUITE(DoubleValues, IntegerTypes);
 
 // The complement in registers is the functor's to the last bit.
-TYPED_TEST(DoubleLanes, AgreeWithTheFunctor) {
-    expectLanesAgree<TypeParam>(bitfcns::BitcmpLanes<TypeParam>{},
-                                bitfcns::BitcmpFtor<TypeParam>{});
+TYPED_TEST(DoubleValues, AgreeWithTheFunctor) {
+    expectElementsAgree<TypeParam>(&ondelBitCmpFcn, {}, bitfcns::BitcmpFtor<TypeParam>{});
 }
 
 // One below the parallel limit and at it give the same bits.

@@ -82,12 +82,12 @@ using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigne
                                       unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(IntegerValues, IntegerTypes);
 
-// Doubles at one position, in registers, read the functor's bit.
-TYPED_TEST(IntegerValues, DoubleLanesAgreeWithTheFunctor) {
+// Doubles taken for T at one position read the functor's bit.
+TYPED_TEST(IntegerValues, DoublesAtOnePositionAgreeWithTheFunctor) {
     using T = TypeParam;
     for (int p = 1; p <= int(sizeof(T) * 8); ++p)
-        expectLanesAgree<T>(bitfcns::BitgetLanes<T>(unsigned(p - 1)),
-                            [p](double x) { return bitfcns::BitgetFtor<T>{}(x, p); });
+        expectElementsAgree<T>(&ondelBitGetFcn, {scalarOf<double>(p).get()},
+                               [p](double x) { return bitfcns::BitgetFtor<T>{}(x, p); });
 }
 
 TYPED_TEST(IntegerValues, EveryPositionClassReadsTheBitsOfTheValueClass) {

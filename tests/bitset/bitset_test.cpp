@@ -109,16 +109,15 @@ TYPED_TEST(DoubleFunctor, AgreesWithTheIntegerFunctor) {
                     << +a << " " << b << " " << v;
 }
 
-// With one position and one V, in registers, as the functor does.
-TYPED_TEST(DoubleFunctor, LanesAgreeWithTheFunctor) {
+// Doubles taken for T with one position and one V, as the functor does.
+TYPED_TEST(DoubleFunctor, OnePositionAgreesWithTheFunctor) {
     using T = TypeParam;
-    for (unsigned index = 0; index < sizeof(T) * 8; ++index) {
-        const double b = index + 1;
-        expectLanesAgree<T>(bitfcns::BitsetLanes<T, true>(index),
-                            [b](double a) { return bitfcns::BitsetFtor<T>{}(a, b, true); });
-        expectLanesAgree<T>(bitfcns::BitsetLanes<T, false>(index),
-                            [b](double a) { return bitfcns::BitsetFtor<T>{}(a, b, false); });
-    }
+    for (double b = 1; b <= sizeof(T) * 8; ++b)
+        for (bool v : {false, true})
+            expectElementsAgree<T>(
+                &ondelBitSetFcn,
+                {testing_support::scalarOf(b).get(), testing_support::scalarOf(v).get()},
+                [b, v](double a) { return bitfcns::BitsetFtor<T>{}(a, b, v); });
 }
 
 // 0, 1, the width and one past it, -1 and 2^40 in every class, and the odd

@@ -128,9 +128,7 @@ TYPED_TEST(BitLogicTest, FailuresLeaveTheSlotAndReleaseConversions) {
 // last bit.
 template <class T>
 void expectDoublesMatchIntegers(EntryPoint entry) {
-    constexpr const char16_t* names[] = {u"int8",  u"uint8",  u"int16", u"uint16",
-                                         u"int32", u"uint32", u"int64", u"uint64"};
-    const auto name = host::makeCharArray(names[classIdOf<T> - zqInt8Class]);
+    const auto name = classNameOf<T>();
     const std::vector<double> x = wholeValuesOf<T>();
     std::vector<double> y(x.rbegin(), x.rend());
     std::vector<T> xs(x.size()), ys(x.size());

@@ -1,11 +1,12 @@
 // Doubles that hold whole numbers of an integer class T, for tests of the
 // double paths: the edges of T (zero of both signs, one, the extremes, the
 // largest double below 2^63 and 2^64), powers of two near the top, and
-// pseudo-random values spread over T's range; and the check of a lane
-// kernel of the double paths against its scalar functor on all of them.
+// pseudo-random values spread over T's range; and the check of a double
+// path, through its entry point, against its scalar functor on all of them.
 #pragma once
 
-#include <emmintrin.h>
+#include "tests/support/host_arrays.hpp"
+
 #include <gtest/gtest.h>
 
 #include <bit>
@@ -42,18 +43,31 @@ std::vector<double> wholeValuesOf() {
     return values;
 }
 
-// Each whole value of T, in both lanes, is accepted by the kernel and gives
-// the bits of `expected(x)`.
-template <class T, class Kernel, class Expected>
-void expectLanesAgree(const Kernel& kernel, Expected expected) {
-    for (double x : wholeValuesOf<T>()) {
-        const __m128d lanes = _mm_set_pd(x, x);
-        ASSERT_EQ(_mm_movemask_pd(kernel.check(lanes)), 3) << x;
-        const __m128d result = kernel.apply(lanes);
-        ASSERT_EQ(std::bit_cast<std::uint64_t>(_mm_cvtsd_f64(result)),
-                  std::bit_cast<std::uint64_t>(expected(x)))
-            << x << " gave " << _mm_cvtsd_f64(result);
-    }
+// The name of T's class as the assumed type of a call.
+template <class T>
+zqArraySlot classNameOf() {
+    constexpr const char16_t* names[] = {u"int8",  u"uint8",  u"int16", u"uint16",
+                                         u"int32", u"uint32", u"int64", u"uint64"};
+    return host::makeCharArray(names[classIdOf<T> - zqInt8Class]);
+}
+
+// `entry` on the whole values of T, then `operands`, then the name of T's
+// class: each element of the result has the bits of `expected(x)`.
+template <class T, class Expected>
+void expectElementsAgree(EntryPoint entry, std::vector<const zqArray_tag*> operands,
+                         Expected expected) {
+    const std::vector<double> values = wholeValuesOf<T>();
+    const auto array = makeOf(values);
+    const auto name = classNameOf<T>();
+    operands.insert(operands.begin(), array.get());
+    operands.push_back(name.get());
+    const auto outcome = callEntry(entry, operands);
+    ASSERT_EQ(outcome.error, "");
+    const auto result = elementsOf<double>(outcome.result.get());
+    for (std::size_t i = 0; i < values.size(); ++i)
+        ASSERT_EQ(std::bit_cast<std::uint64_t>(result[i]),
+                  std::bit_cast<std::uint64_t>(expected(values[i])))
+            << values[i] << " gave " << result[i];
 }
 
 }  // namespace testing_support
