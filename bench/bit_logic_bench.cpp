@@ -1,7 +1,7 @@
 // Benchmarks of bitand, bitor and bitxor through their entry points at 5e6
-// elements: two uint8 arrays (the integer path), two double arrays (the
-// default path: validation, conversion to uint64, the element routine and
-// the conversion back), and a uint8 array with a double scalar.
+// elements (two double arrays also at 1e3 and 5e7): two uint8 arrays (the integer path), two double
+// arrays (the default path: validation, conversion to uint64, the element routine and the
+// conversion back), and a uint8 array with a double scalar.
 #include "bench_support.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "host/array_factory.hpp"
@@ -51,6 +51,10 @@ void registerFunction(const std::string& function) {
     registerCounts(function + "/onInteger/uint8", &logicCase<entry, unsigned char, unsigned char>,
                    counts);
     registerCounts(function + "/onDouble/double", &logicCase<entry, double, double>, counts);
+    // The same path by the form of the other families' names, at a call's
+    // smallest and the memory's scale.
+    registerCounts(function + "/onDouble/double/fresh", &logicCase<entry, double, double>,
+                   {1000, 50000000});
     registerCounts(function + "/onInteger/uint8-doubleScalar",
                    &logicCase<entry, unsigned char, double>, counts);
 }

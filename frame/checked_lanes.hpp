@@ -61,8 +61,10 @@ __m128d applyLanes(const Kernel& kernel, __m128d x, __m128d y) noexcept {
 // hardware prefetchers don't keep one core's loads ahead of memory here.
 inline constexpr unsigned long prefetchElements = 256;
 
+// Flattened: every call in the loop, the kernel's among them, is inlined.
 template <class Kernel, Pass pass>
-void runRange(const void* context, unsigned long begin, unsigned long end) noexcept {
+[[gnu::flatten]] void runRange(const void* context, unsigned long begin,
+                               unsigned long end) noexcept {
     const Run<Kernel>& run = *static_cast<const Run<Kernel>*>(context);
     // Locals: a store through `out` may not reload them.
     const double* const first = run.first;

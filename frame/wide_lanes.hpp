@@ -78,8 +78,10 @@ struct Run {
 
 // A kernel has `arity` (1 or 2), `parallelLimit`, `__mmask8 check(x[, y])`
 // and `__m512d apply(x[, y])`, as the lane kernels of checked_lanes.hpp.
+// Flattened: every call in the loop, the kernel's among them, is inlined.
 template <class Kernel, Pass pass>
-void runRange(const void* context, unsigned long begin, unsigned long end) noexcept {
+[[gnu::flatten]] void runRange(const void* context, unsigned long begin,
+                               unsigned long end) noexcept {
     const Run<Kernel>& run = *static_cast<const Run<Kernel>*>(context);
     const double* const first = run.first;
     const double* const second = run.second;
