@@ -93,6 +93,9 @@ void bitgetDoubleDriver(const zqArray_tag* values, const zqArray_tag* positions,
     const double* x = dataOf<double>(values);
     const double* p = dataOf<double>(positions);
     if (positionsScalar && getBitsAtOnePosition<T>(x, *p, dataOf<double>(result), n)) return;
+    if (!positionsScalar && !valuesScalar && laneWidth() == LaneWidth::avx512 &&
+        getBitsWide<T>(x, p, dataOf<double>(result), n))
+        return;
     // All values before any position, so a bad value hides a bad position.
     if (valuesScalar || n != 0) {
         if (!allFitInteger<T>(x, valuesScalar ? 1 : n)) raiseError<VESPRA::bitget::outOfRange>();

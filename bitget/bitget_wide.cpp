@@ -25,7 +25,27 @@ struct WideBitget {
     }
 };
 
+template <class T>
+struct WideBitgetAtPositions {
+    static constexpr int arity = 2;
+    static constexpr unsigned long parallelLimit = limits::bitgetOnDouble;
+
+    __mmask8 check(__m512d x, __m512d p) const noexcept {
+        return static_cast<__mmask8>(wide::fits<T>(x) &
+                                     wide::positionsValid(p, double(sizeof(T) * 8)));
+    }
+    __m512d apply(__m512d x, __m512d p) const noexcept {
+        const __m512i shifted = _mm512_srlv_epi64(wide::toInteger<T>(x), wide::bitIndices(p));
+        return _mm512_cvtepi64_pd(_mm512_and_si512(shifted, _mm512_set1_epi64(1)));
+    }
+};
+
 }  // namespace
+
+template <class T>
+bool getBitsWide(const double* in, const double* positions, double* out, unsigned long n) {
+    return wide::runLanes(WideBitgetAtPositions<T>{}, in, positions, out, n, &runInRanges);
+}
 
 template <class T>
 bool getBitWide(const double* in, unsigned index, double* out, unsigned long n) {
@@ -40,5 +60,13 @@ template bool getBitWide<int>(const double*, unsigned, double*, unsigned long);
 template bool getBitWide<unsigned int>(const double*, unsigned, double*, unsigned long);
 template bool getBitWide<long>(const double*, unsigned, double*, unsigned long);
 template bool getBitWide<unsigned long>(const double*, unsigned, double*, unsigned long);
+template bool getBitsWide<signed char>(const double*, const double*, double*, unsigned long);
+template bool getBitsWide<unsigned char>(const double*, const double*, double*, unsigned long);
+template bool getBitsWide<short>(const double*, const double*, double*, unsigned long);
+template bool getBitsWide<unsigned short>(const double*, const double*, double*, unsigned long);
+template bool getBitsWide<int>(const double*, const double*, double*, unsigned long);
+template bool getBitsWide<unsigned int>(const double*, const double*, double*, unsigned long);
+template bool getBitsWide<long>(const double*, const double*, double*, unsigned long);
+template bool getBitsWide<unsigned long>(const double*, const double*, double*, unsigned long);
 
 }  // namespace bitfcns

@@ -8,4 +8,9 @@ namespace bitfcns {
 template <class T>
 bool getBitWide(const double* in, unsigned index, double* out, unsigned long n);
 
+// The same with an array of n positions (whole numbers from 1 to T's width
+// for every element to be accepted).
+template <class T>
+bool getBitsWide(const double* in, const double* positions, double* out, unsigned long n);
+
 }  // namespace bitfcns

@@ -53,6 +53,9 @@ void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool
     if (scalarBit && scalarValue &&
         setAtOnePosition<T>(values, *positions, *valueData, dataOf<double>(result), n))
         return;
+    if (!scalarBit && !scalarA && scalarValue && laneWidth() == LaneWidth::avx512 &&
+        setBitsWide<T>(values, positions, *valueData, dataOf<double>(result), n))
+        return;
     if (!allFitInteger<T>(values, scalarA ? 1 : n)) raiseError<errors::outOfRange>();
     checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>);
     runVectorOp(

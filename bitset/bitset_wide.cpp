@@ -24,7 +24,32 @@ struct WideBitset {
     }
 };
 
+template <class T, bool set>
+struct WideBitsetAtPositions {
+    static constexpr int arity = 2;
+    static constexpr unsigned long parallelLimit = limits::bitsetOnDouble;
+
+    __mmask8 check(__m512d x, __m512d b) const noexcept {
+        return static_cast<__mmask8>(wide::fits<T>(x) &
+                                     wide::positionsValid(b, double(sizeof(T) * 8)));
+    }
+    __m512d apply(__m512d x, __m512d b) const noexcept {
+        const __m512i v = wide::toInteger<T>(x);
+        const __m512i mask = _mm512_sllv_epi64(_mm512_set1_epi64(1), wide::bitIndices(b));
+        return wide::toDouble<T>(set ? _mm512_or_si512(v, mask) : _mm512_andnot_si512(mask, v));
+    }
+};
+
 }  // namespace
+
+template <class T>
+bool setBitsWide(const double* in, const double* positions, bool set, double* out,
+                 unsigned long n) {
+    if (set)
+        return wide::runLanes(WideBitsetAtPositions<T, true>{}, in, positions, out, n,
+                              &runInRanges);
+    return wide::runLanes(WideBitsetAtPositions<T, false>{}, in, positions, out, n, &runInRanges);
+}
 
 template <class T>
 bool setBitWide(const double* in, unsigned index, bool set, double* out, unsigned long n) {
@@ -41,5 +66,16 @@ template bool setBitWide<int>(const double*, unsigned, bool, double*, unsigned l
 template bool setBitWide<unsigned int>(const double*, unsigned, bool, double*, unsigned long);
 template bool setBitWide<long>(const double*, unsigned, bool, double*, unsigned long);
 template bool setBitWide<unsigned long>(const double*, unsigned, bool, double*, unsigned long);
+template bool setBitsWide<signed char>(const double*, const double*, bool, double*, unsigned long);
+template bool setBitsWide<unsigned char>(const double*, const double*, bool, double*,
+                                         unsigned long);
+template bool setBitsWide<short>(const double*, const double*, bool, double*, unsigned long);
+template bool setBitsWide<unsigned short>(const double*, const double*, bool, double*,
+                                          unsigned long);
+template bool setBitsWide<int>(const double*, const double*, bool, double*, unsigned long);
+template bool setBitsWide<unsigned int>(const double*, const double*, bool, double*, unsigned long);
+template bool setBitsWide<long>(const double*, const double*, bool, double*, unsigned long);
+template bool setBitsWide<unsigned long>(const double*, const double*, bool, double*,
+                                         unsigned long);
 
 }  // namespace bitfcns

@@ -9,4 +9,9 @@ namespace bitfcns {
 template <class T>
 bool setBitWide(const double* in, unsigned index, bool set, double* out, unsigned long n);
 
+// The same with an array of n positions (whole numbers from 1 to T's width
+// for every element to be accepted).
+template <class T>
+bool setBitsWide(const double* in, const double* positions, bool set, double* out, unsigned long n);
+
 }  // namespace bitfcns

@@ -100,6 +100,9 @@ void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, z
     const double* values = dataOf<const double>(first);
     const double* counts = dataOf<const double>(second);
     if (secondIsScalar && shiftByOneCount<T>(values, *counts, dataOf<double>(result), n)) return;
+    if (!secondIsScalar && !firstIsScalar && laneWidth() == LaneWidth::avx512 &&
+        shiftByCountsWide<T>(values, counts, dataOf<double>(result), n))
+        return;
     if (!allFitInteger<T>(values, firstIsScalar ? 1 : n)) raiseError<errors::outOfRange>();
     if (!allWholeCounts(counts, secondIsScalar ? 1 : n)) raiseError<errors::inputsMustBeIntegers>();
     if (n == 0) return;

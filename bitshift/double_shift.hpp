@@ -15,4 +15,9 @@ enum class DoubleShift { left, right, out };
 template <class T>
 bool shiftWide(const double* in, DoubleShift kind, int amount, double* out, unsigned long n);
 
+// BitshiftFtor<T> with an array of n counts (whole and finite for every
+// element to be accepted), eight elements at a time.
+template <class T>
+bool shiftByCountsWide(const double* in, const double* counts, double* out, unsigned long n);
+
 }  // namespace bitfcns

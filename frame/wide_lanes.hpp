@@ -39,6 +39,20 @@ __mmask8 fits(__m512d x) noexcept {
     return _mm512_mask_cmp_pd_mask(within, truncated, x, _CMP_EQ_OQ);
 }
 
+// The lanes of p that are whole numbers from 1 to `width`: bit positions.
+inline __mmask8 positionsValid(__m512d p, double width) noexcept {
+    const __mmask8 above = _mm512_cmp_pd_mask(p, broadcast(1.0), _CMP_GE_OQ);
+    const __mmask8 within = _mm512_mask_cmp_pd_mask(above, p, broadcast(width), _CMP_LE_OQ);
+    const __m512d truncated =
+        _mm512_maskz_roundscale_pd(0xFF, p, _MM_FROUND_TO_ZERO | _MM_FROUND_NO_EXC);
+    return _mm512_mask_cmp_pd_mask(within, truncated, p, _CMP_EQ_OQ);
+}
+
+// The zero-based bit index of each valid position, in a 64-bit lane.
+inline __m512i bitIndices(__m512d p) noexcept {
+    return _mm512_sub_epi64(_mm512_cvttpd_epi64(p), _mm512_set1_epi64(1));
+}
+
 // Each lane's value in T, in a 64-bit lane: exact for whole numbers of T.
 template <class T>
 __m512i toInteger(__m512d x) noexcept {

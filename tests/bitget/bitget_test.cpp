@@ -82,12 +82,18 @@ using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigne
                                       unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(IntegerValues, IntegerTypes);
 
-// Doubles taken for T at one position read the functor's bit.
+// Doubles taken for T at one position, and at an array of them, read the
+// functor's bit.
 TYPED_TEST(IntegerValues, DoublesAtOnePositionAgreeWithTheFunctor) {
     using T = TypeParam;
     for (int p = 1; p <= int(sizeof(T) * 8); ++p)
         expectElementsAgree<T>(&ondelBitGetFcn, {scalarOf<double>(p).get()},
                                [p](double x) { return bitfcns::BitgetFtor<T>{}(x, p); });
+    const auto positions =
+        alongsideWholeValues<T>([](std::size_t i) { return double(i % widthOf<T> + 1); });
+    expectElementsAgree<T>(
+        &ondelBitGetFcn, {makeOf(positions).get()},
+        [&](double x, std::size_t i) { return bitfcns::BitgetFtor<T>{}(x, positions[i]); });
 }
 
 TYPED_TEST(IntegerValues, EveryPositionClassReadsTheBitsOfTheValueClass) {

@@ -109,7 +109,8 @@ TYPED_TEST(DoubleFunctor, AgreesWithTheIntegerFunctor) {
                     << +a << " " << b << " " << v;
 }
 
-// Doubles taken for T with one position and one V, as the functor does.
+// Doubles taken for T with one position or an array of them, and one V, as
+// the functor does.
 TYPED_TEST(DoubleFunctor, OnePositionAgreesWithTheFunctor) {
     using T = TypeParam;
     for (double b = 1; b <= sizeof(T) * 8; ++b)
@@ -118,6 +119,12 @@ TYPED_TEST(DoubleFunctor, OnePositionAgreesWithTheFunctor) {
                 &ondelBitSetFcn,
                 {testing_support::scalarOf(b).get(), testing_support::scalarOf(v).get()},
                 [b, v](double a) { return bitfcns::BitsetFtor<T>{}(a, b, v); });
+    const auto bits =
+        alongsideWholeValues<T>([](std::size_t i) { return double(i % (sizeof(T) * 8) + 1); });
+    for (bool v : {false, true})
+        expectElementsAgree<T>(
+            &ondelBitSetFcn, {makeOf(bits).get(), testing_support::scalarOf(v).get()},
+            [&](double a, std::size_t i) { return bitfcns::BitsetFtor<T>{}(a, bits[i], v); });
 }
 
 // 0, 1, the width and one past it, -1 and 2^40 in every class, and the odd

@@ -159,13 +159,21 @@ void checkAgainstReference(const std::vector<T>& values, const std::vector<U>& c
 }
 
 // Doubles taken for T by one count, as the functor shifts them: every count
-// within the width and one beyond it each way.
+// within the width and one beyond it each way; and by an array of counts.
 TYPED_TEST(EveryValueClass, DoublesByOneCountAgreeWithTheFunctor) {
     using T = TypeParam;
     constexpr double width = sizeof(T) * 8;
     for (double c = -width - 1; c <= width + 1; ++c)
         expectElementsAgree<T>(&ondelBitShiftFcn, {scalarOf(c).get()},
                                [c](double x) { return bitfcns::BitshiftFtor<T>{}(x, c); });
+    // An array of counts, beyond 64 and far beyond either way among them.
+    const double far[] = {1e300, -1e300, 64, -64, 65, -65, 0, -0.0};
+    const auto counts = alongsideWholeValues<T>([&](std::size_t i) {
+        return i % 3 == 0 ? far[i / 3 % 8] : double(int(i % (2 * int(width) + 5)) - int(width) - 2);
+    });
+    expectElementsAgree<T>(&ondelBitShiftFcn, {makeOf(counts).get()}, [&](double x, std::size_t i) {
+        return bitfcns::BitshiftFtor<T>{}(x, counts[i]);
+    });
 }
 
 TYPED_TEST(EveryValueClass, SerialAndParallelRunsFollowTheRule) {

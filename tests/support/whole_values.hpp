@@ -51,8 +51,17 @@ zqArraySlot classNameOf() {
     return host::makeCharArray(names[classIdOf<T> - zqInt8Class]);
 }
 
+// One double for each whole value of T: `pick(i)` for the element at index i.
+template <class T, class Pick>
+std::vector<double> alongsideWholeValues(Pick pick) {
+    std::vector<double> values(wholeValuesOf<T>().size());
+    for (std::size_t i = 0; i < values.size(); ++i) values[i] = pick(i);
+    return values;
+}
+
 // `entry` on the whole values of T, then `operands`, then the name of T's
-// class: each element of the result has the bits of `expected(x)`.
+// class: each element of the result has the bits of `expected(x)`, or of
+// `expected(x, i)` for the element at index i.
 template <class T, class Expected>
 void expectElementsAgree(EntryPoint entry, std::vector<const zqArray_tag*> operands,
                          Expected expected) {
@@ -65,9 +74,15 @@ void expectElementsAgree(EntryPoint entry, std::vector<const zqArray_tag*> opera
     ASSERT_EQ(outcome.error, "");
     const auto result = elementsOf<double>(outcome.result.get());
     for (std::size_t i = 0; i < values.size(); ++i)
-        ASSERT_EQ(std::bit_cast<std::uint64_t>(result[i]),
-                  std::bit_cast<std::uint64_t>(expected(values[i])))
-            << values[i] << " gave " << result[i];
+        if constexpr (std::is_invocable_v<Expected, double, std::size_t>) {
+            ASSERT_EQ(std::bit_cast<std::uint64_t>(result[i]),
+                      std::bit_cast<std::uint64_t>(expected(values[i], i)))
+                << values[i] << " at " << i << " gave " << result[i];
+        } else {
+            ASSERT_EQ(std::bit_cast<std::uint64_t>(result[i]),
+                      std::bit_cast<std::uint64_t>(expected(values[i])))
+                << values[i] << " gave " << result[i];
+        }
 }
 
 }  // namespace testing_support
