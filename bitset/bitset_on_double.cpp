@@ -42,8 +42,9 @@ bool setAtOnePosition(const double* values, double position, bool value, double*
 // Validates all of A, then all of BIT, for class T, and fills the result,
 // which exists already. A scalar operand is validated even when the result
 // is empty. In place nothing is written before both have passed, so a
-// refusal leaves A untouched; a fresh result with one position and one V is
-// tested and written in one pass. V needs no test: it is logical.
+// refusal leaves A untouched; a fresh result with one position (on AVX-512
+// also with an array of them) and one V is tested and written in one pass.
+// V needs no test: it is logical.
 template <class T>
 void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool* valueData,
                         zqArray_tag* result, bool scalarA, bool scalarBit, bool scalarValue) {

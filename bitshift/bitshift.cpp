@@ -90,9 +90,9 @@ bool shiftByOneCount(const double* values, double count, double* out, unsigned l
 // Validates the values for class T and the counts, then shifts into
 // `result`, refusing a bad value before a bad count. In place every element
 // is tested before any is written, so a refused call leaves values whose
-// storage the result shares untouched; a fresh result by one count is
-// tested and written in one pass. A scalar operand is tested even when the
-// other is empty.
+// storage the result shares untouched; a fresh result by one count (on
+// AVX-512 also by an array of them) is tested and written in one pass. A
+// scalar operand is tested even when the other is empty.
 template <class T>
 void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, zqArray_tag* result,
                           bool firstIsScalar, bool secondIsScalar) {
