@@ -2,7 +2,6 @@
 // the double path (the complement of each element taken for the assumed
 // class, tested in the same pass).
 #include "bitcmp/bitcmp_ftor.hpp"
-#include "bitcmp/bitcmp_wide.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "engine/parallel_driver.hpp"
 #include "frame/array.hpp"
@@ -10,7 +9,6 @@
 #include "frame/checked_lanes.hpp"
 #include "frame/class_types.hpp"
 #include "frame/exception.hpp"
-#include "frame/lane_width.hpp"
 #include "frame/math_routines.hpp"
 #include "frame/message_tags.hpp"
 
@@ -52,14 +50,9 @@ void bitcmpIntegerOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** 
 // result is tested and written in one pass, and a refusal destroys it.
 template <class T>
 void bitcmpDoubleDriver(const zqArray_tag* operand, zqArray_tag* result) {
-    const double* in = dataOf<double>(operand);
-    double* out = dataOf<double>(result);
-    const unsigned long n = numberOfElements(result);
-    const bool accepted =
-        laneWidth() == LaneWidth::avx512
-            ? complementWide<T>(in, out, n)
-            : runCheckedLanes(BitcmpLanes<T>{}, in, nullptr, out, n, &runInRanges);
-    if (!accepted) raiseError<errors::outOfRange>();
+    if (!runCheckedLanes(BitcmpLanes<T>{}, dataOf<double>(operand), nullptr, dataOf<double>(result),
+                         numberOfElements(result), &runInRanges))
+        raiseError<errors::outOfRange>();
 }
 
 void bitcmpDoubleOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {

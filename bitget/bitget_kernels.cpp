@@ -5,7 +5,6 @@
 #include "bitget/bitget_kernels.hpp"
 
 #include "bitget/bitget_ftors.hpp"
-#include "bitget/bitget_wide.hpp"
 #include "engine/operator_families.hpp"
 #include "engine/parallel_driver.hpp"
 #include "engine/vector_ops.hpp"
@@ -14,7 +13,6 @@
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
-#include "frame/lane_width.hpp"
 #include "frame/message_tags.hpp"
 #include "frame/position_scan.hpp"
 
@@ -79,9 +77,8 @@ void bitgetFloatingPositions(T* out, const T* in, const U* positions, unsigned l
 template <class T>
 bool getBitsAtOnePosition(const double* x, double p, double* out, unsigned long n) {
     if (!bitIsValid(p, bitWidth<T>)) return false;
-    const auto index = static_cast<unsigned>(static_cast<int>(p) - 1);
-    if (laneWidth() == LaneWidth::avx512) return getBitWide<T>(x, index, out, n);
-    return runCheckedLanes(BitgetLanes<T>(index), x, nullptr, out, n, &runInRanges);
+    const BitgetLanes<T> kernel(static_cast<unsigned>(static_cast<int>(p) - 1));
+    return runCheckedLanes(kernel, x, nullptr, out, n, &runInRanges);
 }
 
 }  // namespace
@@ -93,9 +90,6 @@ void bitgetDoubleDriver(const zqArray_tag* values, const zqArray_tag* positions,
     const double* x = dataOf<double>(values);
     const double* p = dataOf<double>(positions);
     if (positionsScalar && getBitsAtOnePosition<T>(x, *p, dataOf<double>(result), n)) return;
-    if (!positionsScalar && !valuesScalar && laneWidth() == LaneWidth::avx512 &&
-        getBitsWide<T>(x, p, dataOf<double>(result), n))
-        return;
     // All values before any position, so a bad value hides a bad position.
     if (valuesScalar || n != 0) {
         if (!allFitInteger<T>(x, valuesScalar ? 1 : n)) raiseError<VESPRA::bitget::outOfRange>();

@@ -5,7 +5,6 @@
 #include "bitset/bit_checks.hpp"
 #include "bitset/bitset_functors.hpp"
 #include "bitset/bitset_paths.hpp"
-#include "bitset/bitset_wide.hpp"
 #include "bitset/result_shape.hpp"
 #include "engine/parallel_driver.hpp"
 #include "engine/vector_ops.hpp"
@@ -15,7 +14,6 @@
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
-#include "frame/lane_width.hpp"
 #include "frame/message_tags.hpp"
 #include "frame/scalar_text.hpp"
 
@@ -33,7 +31,6 @@ bool setAtOnePosition(const double* values, double position, bool value, double*
                       unsigned long n) {
     if (!bitIsValid(position, bitWidth<T>)) return false;
     const std::uint32_t index = bitIndexOf(position);
-    if (laneWidth() == LaneWidth::avx512) return setBitWide<T>(values, index, value, out, n);
     if (value)
         return runCheckedLanes(BitsetLanes<T, true>(index), values, nullptr, out, n, &runInRanges);
     return runCheckedLanes(BitsetLanes<T, false>(index), values, nullptr, out, n, &runInRanges);
@@ -42,9 +39,8 @@ bool setAtOnePosition(const double* values, double position, bool value, double*
 // Validates all of A, then all of BIT, for class T, and fills the result,
 // which exists already. A scalar operand is validated even when the result
 // is empty. In place nothing is written before both have passed, so a
-// refusal leaves A untouched; a fresh result with one position (on AVX-512
-// also with an array of them) and one V is tested and written in one pass.
-// V needs no test: it is logical.
+// refusal leaves A untouched; a fresh result with one position and one V is
+// tested and written in one pass. V needs no test: it is logical.
 template <class T>
 void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool* valueData,
                         zqArray_tag* result, bool scalarA, bool scalarBit, bool scalarValue) {
@@ -53,9 +49,6 @@ void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool
     const double* positions = dataOf<double>(bit);
     if (scalarBit && scalarValue &&
         setAtOnePosition<T>(values, *positions, *valueData, dataOf<double>(result), n))
-        return;
-    if (!scalarBit && !scalarA && scalarValue && laneWidth() == LaneWidth::avx512 &&
-        setBitsWide<T>(values, positions, *valueData, dataOf<double>(result), n))
         return;
     if (!allFitInteger<T>(values, scalarA ? 1 : n)) raiseError<errors::outOfRange>();
     checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>);

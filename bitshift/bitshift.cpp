@@ -14,7 +14,6 @@
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
-#include "frame/lane_width.hpp"
 #include "frame/message_tags.hpp"
 
 #include <cmath>
@@ -73,26 +72,17 @@ bool shiftByOneCount(const double* values, double count, double* out, unsigned l
         return runCheckedLanes(kernel, values, nullptr, out, n, &runInRanges);
     };
     constexpr double width = bitWidth<T>;
-    const bool wide = laneWidth() == LaneWidth::avx512;
-    if (!(std::fabs(count) < width)) {
-        if (wide) return shiftWide<T>(values, DoubleShift::out, count < 0 ? -1 : 1, out, n);
-        return run(BitshiftLanes<T, DoubleShift::out>(count));
-    }
-    const int k = static_cast<int>(count);
-    if (k > 0) {
-        if (wide) return shiftWide<T>(values, DoubleShift::left, k, out, n);
-        return run(BitshiftLanes<T, DoubleShift::left>(count));
-    }
-    if (wide) return shiftWide<T>(values, DoubleShift::right, -k, out, n);
+    if (!(std::fabs(count) < width)) return run(BitshiftLanes<T, DoubleShift::out>(count));
+    if (count > 0) return run(BitshiftLanes<T, DoubleShift::left>(count));
     return run(BitshiftLanes<T, DoubleShift::right>(count));
 }
 
 // Validates the values for class T and the counts, then shifts into
 // `result`, refusing a bad value before a bad count. In place every element
 // is tested before any is written, so a refused call leaves values whose
-// storage the result shares untouched; a fresh result by one count (on
-// AVX-512 also by an array of them) is tested and written in one pass. A
-// scalar operand is tested even when the other is empty.
+// storage the result shares untouched; a fresh result by one count is
+// tested and written in one pass. A scalar operand is tested even when the
+// other is empty.
 template <class T>
 void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, zqArray_tag* result,
                           bool firstIsScalar, bool secondIsScalar) {
@@ -100,9 +90,6 @@ void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, z
     const double* values = dataOf<const double>(first);
     const double* counts = dataOf<const double>(second);
     if (secondIsScalar && shiftByOneCount<T>(values, *counts, dataOf<double>(result), n)) return;
-    if (!secondIsScalar && !firstIsScalar && laneWidth() == LaneWidth::avx512 &&
-        shiftByCountsWide<T>(values, counts, dataOf<double>(result), n))
-        return;
     if (!allFitInteger<T>(values, firstIsScalar ? 1 : n)) raiseError<errors::outOfRange>();
     if (!allWholeCounts(counts, secondIsScalar ? 1 : n)) raiseError<errors::inputsMustBeIntegers>();
     if (n == 0) return;

@@ -6,7 +6,6 @@
 // no shift by the width or more is ever made.
 #pragma once
 
-#include "bitshift/double_shift.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine/simd_functors.hpp"
 #include "frame/class_types.hpp"
@@ -95,6 +94,10 @@ struct BitshiftFtor {
         return integerToDouble(k > 0 ? shiftLeftWithin(value, k) : shiftRightWithin(value, -k));
     }
 };
+
+// What one count does to every double: shift left within the width, shift
+// right, or shift everything out (a count at or beyond the width).
+enum class DoubleShift { left, right, out };
 
 // BitshiftFtor<T> by one whole count, as a lane kernel of the double path's
 // checked loop. Left: the pattern in T shifted, read back as T. Right: the

@@ -36,14 +36,3 @@ function(bitfcns_add_component)
     endforeach()
   endif()
 endfunction()
-
-# bitfcns_wide_sources(<src>...)
-#
-# Compiles the given sources of the current directory for AVX-512 F and DQ:
-# the wide variants of the double paths, called only where the processor has
-# them (frame/lane_width.hpp). g++ 12 warns of the undefined source
-# operand that its AVX-512 intrinsic headers pass to their builtins.
-function(bitfcns_wide_sources)
-  set_source_files_properties(${ARGN} PROPERTIES COMPILE_OPTIONS
-    "-mavx512f;-mavx512dq;$<$<CXX_COMPILER_ID:GNU>:-Wno-maybe-uninitialized>")
-endfunction()

@@ -12,10 +12,8 @@
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
 #include "frame/floating.hpp"
-#include "frame/lane_width.hpp"
 #include "frame/math_routines.hpp"
 #include "frame/message_tags.hpp"
-#include "logic/bit_logic_wide.hpp"
 
 #include <boost/intrusive_ptr.hpp>
 
@@ -28,15 +26,12 @@ using ElementRoutine = zqArraySlot (*)(const zqArray_tag*, const zqArray_tag*);
 
 // The bit operations on the patterns of two registers.
 struct AndBits {
-    static constexpr BitOp op = BitOp::bitAnd;
     static __m128i apply(__m128i a, __m128i b) noexcept { return _mm_and_si128(a, b); }
 };
 struct OrBits {
-    static constexpr BitOp op = BitOp::bitOr;
     static __m128i apply(__m128i a, __m128i b) noexcept { return _mm_or_si128(a, b); }
 };
 struct XorBits {
-    static constexpr BitOp op = BitOp::bitXor;
     static __m128i apply(__m128i a, __m128i b) noexcept { return _mm_xor_si128(a, b); }
 };
 
@@ -46,7 +41,7 @@ struct XorBits {
 // element loop does, at the same result size.
 template <class T, class Combine>
 struct CombineLanesBase {
-    static constexpr unsigned long parallelLimit = bitLogicOnDouble;
+    static constexpr unsigned long parallelLimit = host::parallelResultBytes / sizeof(double);
 
     scan_detail::LaneTest<T> fits;
 
@@ -222,18 +217,15 @@ private:
             workClass,
             [&]<class Tag>(Tag) {
                 using T = typename Tag::type;
-                const bool wide = laneWidth() == LaneWidth::avx512;
                 if (firstIsScalar == secondIsScalar) {
-                    if (wide) return combineWide<T>(Combine::op, first, second, false, out, n);
                     return runCheckedLanes(CombineArrayLanes<T, Combine>{}, first, second, out, n,
                                            &runInRanges);
                 }
-                const double* scalar = firstIsScalar ? first : second;
-                const double* array = firstIsScalar ? second : first;
-                if (!fitsInteger<T>(*scalar)) return false;
-                if (wide) return combineWide<T>(Combine::op, array, scalar, true, out, n);
-                return runCheckedLanes(CombineScalarLanes<T, Combine>(*scalar), array, nullptr, out,
-                                       n, &runInRanges);
+                const double scalar = firstIsScalar ? *first : *second;
+                if (!fitsInteger<T>(scalar)) return false;
+                return runCheckedLanes(CombineScalarLanes<T, Combine>(scalar),
+                                       firstIsScalar ? second : first, nullptr, out, n,
+                                       &runInRanges);
             },
             [] { return false; });
         return accepted ? std::move(result) : nullptr;
