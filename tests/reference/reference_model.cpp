@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cmath>
 #include <cstring>
+#include <deque>
 #include <string_view>
 
 namespace reference {
@@ -219,6 +220,7 @@ private:
     std::size_t allocations_ = 0;
     bool shares_ = false, slotFilled_ = false;
     Outcome outcome_;
+    std::deque<Operand> conversions_;
 
     void counts(std::size_t fewest, std::size_t most) {
         if (nlhs_ > 1) refuse("VESPRA:maxlhs");
@@ -250,11 +252,11 @@ private:
     }
 
     // The host's conversion: the operand itself when of class `cls`.
-    Operand converted(const Operand& a, zqClassID cls) {
+    const Operand& converted(const Operand& a, zqClassID cls) {
         if (a.cls == cls) return a;
         if (isComplex(a) && cls == zqLogicalClass) refuse("VESPRA:bsxfun:badOperands");
         allocate(countOf(a) * elementSize(cls), isComplex(a));
-        Operand c;
+        Operand& c = conversions_.emplace_back();
         c.cls = cls;
         c.complex = isComplex(a);
         c.dims = shapeOf(a);
@@ -356,13 +358,14 @@ private:
         }
         const zqClassID work = in_.size() == 3 ? parseType(in_[2]) : zqUInt64Class;
         if (!work) fail("unknownTypeString");
-        const auto convert = [&](const Operand& x) {
+        const auto convert = [&](const Operand& x) -> const Operand& {
             if (x.cls == zqDoubleClass && !allFit(x, work)) fail("outOfRange");
             return converted(x, work);
         };
-        const Operand first = convert(a);
-        const Operand second = convert(b);
-        finish(converted(combine(first, second, op, work), zqDoubleClass));
+        const Operand& first = convert(a);
+        const Operand& second = convert(b);
+        const Operand bits = combine(first, second, op, work);
+        finish(converted(bits, zqDoubleClass));
     }
 
     void bitcmp() {
@@ -493,21 +496,22 @@ private:
     Operand bitsetOnDouble(const std::vector<const Operand*>& list, bool intoSlot) {
         const Operand &a = *list[0], &bit = *list[1];
         const bool withV = list.size() == 4 || (list.size() == 3 && !isScalarText(*list[2]));
-        std::optional<Operand> value;  // V's logical form
+        const Operand* v = nullptr;  // V's logical form
         zqClassID cls = zqUInt64Class;
         if (withV) {
-            const Operand& v = *list[2];
-            if (a.sparse || bit.sparse || v.sparse) refuse("VESPRA:bitset:sparseArgs");
-            if (v.cls == zqSingleClass) refuse("VESPRA:bitset:invalidV");
-            if (isComplex(a) || isComplex(bit) || isComplex(v)) refuse("VESPRA:bitset:complexArgs");
+            const Operand& given = *list[2];
+            if (a.sparse || bit.sparse || given.sparse) refuse("VESPRA:bitset:sparseArgs");
+            if (given.cls == zqSingleClass) refuse("VESPRA:bitset:invalidV");
+            if (isComplex(a) || isComplex(bit) || isComplex(given)) {
+                refuse("VESPRA:bitset:complexArgs");
+            }
             if (bit.cls == zqSingleClass) refuse("VESPRA:bitSetGet:firstArgNotInt");
-            if (v.cls != zqLogicalClass && !isNumeric(v)) refuse("VESPRA:bitset:invalidV");
-            value = converted(v, zqLogicalClass);
+            if (given.cls != zqLogicalClass && !isNumeric(given)) refuse("VESPRA:bitset:invalidV");
+            v = &converted(given, zqLogicalClass);
         } else {
             if (a.sparse || bit.sparse) refuse("VESPRA:bitset:sparseArgs");
             if (isComplex(a) || isComplex(bit)) refuse("VESPRA:bitset:complexArgs");
         }
-        const Operand* v = value ? &*value : nullptr;
         const Dims dims = bitsetShape(a, bit, v, "VESPRA:bitset:sizeMismatch");
         if (list.size() == 4 || (list.size() == 3 && !withV)) cls = parseType(*list.back());
         Operand r = makeResult(a, !isScalar(a), zqDoubleClass, dims, intoSlot);
@@ -536,11 +540,8 @@ private:
         if (v && !isNumeric(*v) && v->cls != zqLogicalClass) refuse("VESPRA:bitset:numericArg");
         if (a.cls == zqDoubleClass) {
             if (bit.cls == zqSingleClass) refuse("VESPRA:bitSetGet:firstArgNotInt");
-            const Operand positions = converted(bit, zqDoubleClass);
-            std::optional<Operand> value;
-            if (v) value = converted(*v, zqLogicalClass);
-            std::vector<const Operand*> list{&a, &positions};
-            if (value) list.push_back(&*value);
+            std::vector<const Operand*> list{&a, &converted(bit, zqDoubleClass)};
+            if (v) list.push_back(&converted(*v, zqLogicalClass));
             if (type) list.push_back(type);
             return bitsetOnDouble(list, false);
         }
