@@ -9,6 +9,7 @@
 
 #include <tbb/global_control.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
@@ -232,11 +233,9 @@ void fillElements(Bytes& in, Operand& op, std::size_t drawn) {
     std::size_t count = 1;
     for (unsigned long d : op.noStoredSizes ? Dims{} : op.dims) count *= d;
     op.bytes.resize(count * size);
-    for (std::size_t i = 0; i < count; ++i) {
+    for (std::size_t i = 0; i < std::min(count, drawn); ++i) {
         unsigned char* out = op.bytes.data() + i * size;
-        if (i >= drawn) {  // large arrays repeat their first elements
-            std::memcpy(out, op.bytes.data() + (i % drawn) * size, size);
-        } else if (op.cls == zqDoubleClass) {
+        if (op.cls == zqDoubleClass) {
             const double x = drawDouble(in);
             std::memcpy(out, &x, size);
         } else if (op.cls == zqSingleClass) {
@@ -251,6 +250,12 @@ void fillElements(Bytes& in, Operand& op, std::size_t drawn) {
         } else {
             drawInteger(in, out, size);
         }
+    }
+    // Large arrays repeat their first elements.
+    for (std::size_t filled = std::min(count, drawn) * size; filled < op.bytes.size();
+         filled *= 2) {
+        std::memcpy(op.bytes.data() + filled, op.bytes.data(),
+                    std::min(filled, op.bytes.size() - filled));
     }
 }
 
@@ -288,10 +293,10 @@ Plan drawOperand(Bytes& in, bool typeRole, bool second, zqClassID first, const D
 }
 
 // Element counts at which loops go parallel: the library's limits, and the
-// host's 256 KiB of result (its AND, OR, XOR and complement). The SIMD limits
-// from 400000 on concern bitget, bitset and bitshift only.
-constexpr unsigned long kLimits[] = {3000,   8000,   12000,  30000,   32768,   40000,
-                                     262144, 400000, 800000, 1000000, 1500000, 1800000};
+// host's 256 KiB of result (its AND, OR, XOR and complement). Of the SIMD
+// limits of bitget, bitset and bitshift only the lowest, which cost least.
+constexpr unsigned long kLimits[] = {3000,  8000,   12000,  30000,  32768,
+                                     40000, 262144, 400000, 800000, 1000000};
 
 Call drawCall(Function function, Bytes& in) {
     Call call;
@@ -311,7 +316,7 @@ Call drawCall(Function function, Bytes& in) {
     if (call.large) {
         const bool simdLimits = function == Function::bitget || function == Function::bitset ||
                                 function == Function::bitshift;
-        const unsigned pick = in.below(simdLimits && in.oneIn(4) ? 12 : 7);
+        const unsigned pick = in.below(simdLimits && in.oneIn(8) ? 10 : 7);
         const unsigned long size = kLimits[pick] - in.below(2);
         base = in.oneIn(2) ? Dims{size, 1} : Dims{1, size};
     }

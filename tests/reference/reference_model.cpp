@@ -122,11 +122,10 @@ bool positionAt(const Operand& a, std::size_t i, int width) {
     return position >= 1 && position <= width;
 }
 
+// Element `i` of an integer or logical result: the low bytes of `v`.
 void put(Operand& r, std::size_t i, Int v) {
-    const std::size_t size = elementSize(r.cls);
-    for (std::size_t byte = 0; byte < size; ++byte) {
-        r.bytes[i * size + byte] = static_cast<unsigned char>(UInt(v) >> (8 * byte));
-    }
+    const auto bits = static_cast<unsigned long>(v);
+    std::memcpy(&r.bytes[i * elementSize(r.cls)], &bits, elementSize(r.cls));
 }
 
 void putDouble(Operand& r, std::size_t i, double x) { std::memcpy(&r.bytes[i * 8], &x, 8); }
