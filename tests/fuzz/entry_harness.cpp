@@ -91,12 +91,18 @@ constexpr double kEdges[] = {
     3.4028234663852886e38};
 // clang-format on
 
-// Small whole numbers serve as bit positions and shift counts.
-double drawDouble(Bytes& in) {
-    switch (in.below(4)) {
-        case 0: return static_cast<double>(static_cast<int>(in.below(150)) - 75);
-        case 1:
-        case 2: return kEdges[in.below(std::size(kEdges))];
+// A tame element: a small whole number, mostly a valid bit position and
+// seldom negative, so that calls get as far as their loops.
+long drawTame(Bytes& in) {
+    const long magnitude = in.oneIn(4) ? in.below(66) : in.below(9);
+    return in.oneIn(8) ? -magnitude : magnitude;
+}
+
+// Wild elements reach the edges of every class and any bit pattern.
+double drawDouble(Bytes& in, bool wild) {
+    switch (wild ? in.below(3) : 0) {
+        case 0: return static_cast<double>(drawTame(in));
+        case 1: return kEdges[in.below(std::size(kEdges))];
         default: {
             double x;
             in.fill(reinterpret_cast<unsigned char*>(&x), sizeof x);
@@ -105,10 +111,10 @@ double drawDouble(Bytes& in) {
     }
 }
 
-void drawInteger(Bytes& in, unsigned char* out, std::size_t size) {
-    const unsigned kind = in.below(4);
+void drawInteger(Bytes& in, unsigned char* out, std::size_t size, bool wild) {
+    const unsigned kind = wild ? in.below(3) : 0;
     if (kind == 0) {
-        const long small = static_cast<long>(in.below(150)) - 75;
+        const long small = drawTame(in);
         std::memcpy(out, &small, size);  // little-endian: the low bytes
         return;
     }
@@ -134,7 +140,8 @@ std::u16string drawText(Bytes& in) {
         "int8", "uint8", "int16", "uint16", "int32",   "uint32", "int64", "uint64",
         "int1", "uint1", "int3",  "uint3",  "int6",    "uint6",  "int",   "uint",
         "i",    "u",     "int7",  "double", "uint641", "int8x",  ""};
-    const char* spelling = spellings[in.below(std::size(spellings))];
+    // The first 14 name a class; the rest are near misses.
+    const char* spelling = spellings[in.below(in.oneIn(4) ? std::size(spellings) : 14)];
     std::u16string text(spelling, spelling + std::strlen(spelling));
     static constexpr char16_t wide[] = {0x80, 0xE9, 0xFF, 0x100, 0x130, 0x212A, 0xFF80, 0xFFFF};
     for (unsigned edits = in.oneIn(3) ? 1 + in.below(3) : 0; edits > 0; --edits) {
@@ -185,27 +192,17 @@ Operand drawTypeOperand(Bytes& in) {
     return op;
 }
 
-// A class; the second operand often takes the first one's.
+// A class, mostly double or an integer; the second operand often takes the
+// first one's.
 zqClassID drawClass(Bytes& in, zqClassID first, bool second) {
     if (second && in.oneIn(2)) return first;
-    switch (in.below(16)) {
-        case 0:
-        case 1:
-        case 2:
-        case 3:
-        case 4: return zqDoubleClass;
-        case 5:
-        case 6:
-        case 7:
-        case 8: return static_cast<zqClassID>(zqInt8Class + in.below(8));
-        case 9:
-        case 10: return first;
-        case 11: return zqSingleClass;
-        case 12: return zqLogicalClass;
-        case 13: return zqCharClass;
-        case 14: return zqStringClass;
-        default: return zqCellClass;
-    }
+    const unsigned pick = in.below(64);
+    if (pick < 28) return zqDoubleClass;
+    if (pick < 56) return static_cast<zqClassID>(zqInt8Class + in.below(8));
+    static constexpr zqClassID others[] = {zqSingleClass,  zqSingleClass, zqLogicalClass,
+                                           zqLogicalClass, zqCharClass,   zqCharClass,
+                                           zqStringClass,  zqCellClass};
+    return others[pick - 56];
 }
 
 // Sizes: a scalar, the call's base shape, its transpose, an empty one, any.
@@ -228,7 +225,7 @@ Dims drawDims(Bytes& in, const Dims& base, bool large) {
     }
 }
 
-void fillElements(Bytes& in, Operand& op, std::size_t drawn) {
+void fillElements(Bytes& in, Operand& op, std::size_t drawn, bool wild) {
     const std::size_t size = reference::elementSize(op.cls);
     std::size_t count = 1;
     for (unsigned long d : op.noStoredSizes ? Dims{} : op.dims) count *= d;
@@ -236,10 +233,10 @@ void fillElements(Bytes& in, Operand& op, std::size_t drawn) {
     for (std::size_t i = 0; i < std::min(count, drawn); ++i) {
         unsigned char* out = op.bytes.data() + i * size;
         if (op.cls == zqDoubleClass) {
-            const double x = drawDouble(in);
+            const double x = drawDouble(in, wild);
             std::memcpy(out, &x, size);
         } else if (op.cls == zqSingleClass) {
-            const float x = static_cast<float>(drawDouble(in));
+            const float x = static_cast<float>(drawDouble(in, wild));
             std::memcpy(out, &x, size);
         } else if (op.cls == zqLogicalClass) {
             *out = in.oneIn(2);
@@ -248,7 +245,7 @@ void fillElements(Bytes& in, Operand& op, std::size_t drawn) {
                                               : u"int8u6x"[in.below(7)];
             std::memcpy(out, &unit, size);
         } else {
-            drawInteger(in, out, size);
+            drawInteger(in, out, size, wild);
         }
     }
     // Large arrays repeat their first elements.
@@ -273,7 +270,9 @@ Plan drawOperand(Bytes& in, bool typeRole, bool second, zqClassID first, const D
             for (std::size_t i = 0; i < count; ++i) op.strings.push_back(drawText(in));
         } else if (op.cls != zqCellClass) {
             op.noStoredSizes = op.dims.empty();
-            fillElements(in, op, large ? 1 + in.below(8) : std::numeric_limits<std::size_t>::max());
+            const bool wild = in.oneIn(4);
+            fillElements(in, op, large ? 1 + in.below(8) : std::numeric_limits<std::size_t>::max(),
+                         wild);
         }
     }
     const bool holdsElements = reference::elementSize(op.cls) != 0;
@@ -322,9 +321,11 @@ Call drawCall(Function function, Bytes& in) {
     }
     zqClassID first = zqDoubleClass;
     for (unsigned i = 0; i < inputs; ++i) {
-        // bitset's third operand is a type or a value operand.
-        const bool typeRole = i > 0 && (function == Function::bitcmp || i >= 3 ||
-                                        (i == 2 && (function != Function::bitset || in.oneIn(2))));
+        // bitset's third operand is a value operand, or with 3 inputs a type.
+        const bool bitsetThird = function == Function::bitset && i == 2;
+        const bool typeRole =
+            i > 0 && (function == Function::bitcmp || i >= 3 || (i == 2 && !bitsetThird) ||
+                      (bitsetThird && inputs == 3 && in.oneIn(2)));
         Operand& op = call.operands.emplace_back();
         call.plans.push_back(drawOperand(in, typeRole, i == 1, first, base, call.large, op));
         if (i == 0) first = op.cls;
