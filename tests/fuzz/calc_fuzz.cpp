@@ -23,6 +23,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         const auto human = bitcalc::makeHumanDisplay(out, errors);
         bitcalc::Evaluator(*human).run(source, false);
     }
+    host::limitStorageBytes(0);
     if (host::liveArrayCount() != liveBefore) {
         std::fprintf(stderr, "*** bitcalc: array records leaked\n");
         std::abort();
