@@ -188,6 +188,21 @@ zqClassID parseType(const Operand& a) {
 
 using Dims = std::vector<unsigned long>;
 
+// Refuses with `id` at the first of the first `count` elements of `a` that
+// isn't `valid`: a scalar's one element is tested even for an empty result.
+template <class Test>
+void scan(const Operand& a, std::size_t count, const char* id, Test valid) {
+    for (std::size_t i = 0, n = isScalar(a) ? 1 : count; i < n; ++i) {
+        if (!valid(i)) refuse(id);
+    }
+}
+
+// The sizes of a result where only a scalar adapts to the other operand.
+Dims scalarOrSame(const Operand& a, const Operand& b, const char* sizeId) {
+    if (!isScalar(a) && !isScalar(b) && shapeOf(a) != shapeOf(b)) refuse(sizeId);
+    return isScalar(a) ? shapeOf(b) : shapeOf(a);
+}
+
 class Model {
 public:
     Model(int nlhs, const std::vector<Operand>& inputs, std::optional<std::size_t> failing)
@@ -409,18 +424,15 @@ private:
         if (a.sparse || p.sparse) refuse("VESPRA:bitget:sparseArgs");
         if (isComplex(a) || isComplex(p)) refuse("VESPRA:bitget:complexArgs");
         const bool aS = isScalar(a), pS = isScalar(p);
-        if (!aS && !pS && shapeOf(a) != shapeOf(p)) refuse("VESPRA:bitget:sizeMismatch");
-        const Dims dims = aS ? shapeOf(p) : shapeOf(a);
+        const Dims dims = scalarOrSame(a, p, "VESPRA:bitget:sizeMismatch");
         const zqClassID cls = type ? parseType(*type) : zqUInt64Class;
         Operand r = makeResult(a, !aS, zqDoubleClass, dims, intoSlot);
         if (!isInteger(cls)) refuse("VESPRA:bitget:unknownTypeString");
         const std::size_t n = countOf(dims);
-        for (std::size_t i = 0; i < (aS ? 1 : n); ++i) {
-            if (!fits(realAt(a, i), cls)) refuse("VESPRA:bitget:outOfRange");
-        }
-        for (std::size_t i = 0; i < (pS ? 1 : n); ++i) {
-            if (!positionAt(p, i, widthOf(cls))) refuse("VESPRA:bitSetGet:BITOutOfRange");
-        }
+        scan(a, n, "VESPRA:bitget:outOfRange",
+             [&](std::size_t i) { return fits(realAt(a, i), cls); });
+        scan(p, n, "VESPRA:bitSetGet:BITOutOfRange",
+             [&](std::size_t i) { return positionAt(p, i, widthOf(cls)); });
         for (std::size_t i = 0; i < n; ++i) {
             const Int v = exact(realAt(a, aS ? 0 : i));
             putDouble(r, i,
@@ -439,8 +451,7 @@ private:
         if (!isInteger(a.cls)) refuse("VESPRA:bitSetGet:firstArgNotInt");
         if (isComplex(a) || isComplex(p)) refuse("VESPRA:bitget:complexArgs");
         const bool aS = isScalar(a), pS = isScalar(p);
-        if (!aS && !pS && shapeOf(a) != shapeOf(p)) refuse("VESPRA:bitSetGet:sizeMismatch");
-        const Dims dims = aS ? shapeOf(p) : shapeOf(a);
+        const Dims dims = scalarOrSame(a, p, "VESPRA:bitSetGet:sizeMismatch");
         if (type) {
             const zqClassID cls = parseType(*type);
             if (!cls) refuse("VESPRA:bitget:unknownTypeString");
@@ -448,9 +459,8 @@ private:
         }
         Operand r = makeResult(a, !aS, a.cls, dims, false);
         const std::size_t n = countOf(dims);
-        for (std::size_t i = 0; i < (pS ? 1 : n); ++i) {
-            if (!positionAt(p, i, widthOf(a.cls))) refuse("VESPRA:bitSetGet:BITOutOfRange");
-        }
+        scan(p, n, "VESPRA:bitSetGet:BITOutOfRange",
+             [&](std::size_t i) { return positionAt(p, i, widthOf(a.cls)); });
         for (std::size_t i = 0; i < n; ++i) {
             const int bit = static_cast<int>(countAt(p, pS ? 0 : i) - 1);
             put(r, i, (integerAt(a, aS ? 0 : i) >> bit) & 1);
@@ -517,12 +527,10 @@ private:
         if (!isInteger(cls)) refuse("VESPRA:bitset:unknownTypeString");
         const std::size_t n = countOf(dims);
         const bool aS = isScalar(a), bS = isScalar(bit), vS = !v || isScalar(*v);
-        for (std::size_t i = 0; i < (aS ? 1 : n); ++i) {
-            if (!fits(realAt(a, i), cls)) refuse("VESPRA:bitset:outOfRange");
-        }
-        for (std::size_t i = 0; i < (bS ? 1 : n); ++i) {
-            if (!positionAt(bit, i, widthOf(cls))) refuse("VESPRA:bitSetGet:BITOutOfRange");
-        }
+        scan(a, n, "VESPRA:bitset:outOfRange",
+             [&](std::size_t i) { return fits(realAt(a, i), cls); });
+        scan(bit, n, "VESPRA:bitSetGet:BITOutOfRange",
+             [&](std::size_t i) { return positionAt(bit, i, widthOf(cls)); });
         for (std::size_t i = 0; i < n; ++i) {
             const Int x = exact(realAt(a, aS ? 0 : i));
             const Int mask = Int(1) << static_cast<int>(countAt(bit, bS ? 0 : i) - 1);
@@ -558,9 +566,8 @@ private:
         Operand r = makeResult(a, !isScalar(a), a.cls, dims, false);
         const std::size_t n = countOf(dims);
         const bool aS = isScalar(a), bS = isScalar(bit), vS = !v || isScalar(*v);
-        for (std::size_t i = 0; i < (bS ? 1 : n); ++i) {
-            if (!positionAt(bit, i, widthOf(a.cls))) refuse("VESPRA:bitSetGet:BITOutOfRange");
-        }
+        scan(bit, n, "VESPRA:bitSetGet:BITOutOfRange",
+             [&](std::size_t i) { return positionAt(bit, i, widthOf(a.cls)); });
         for (std::size_t i = 0; i < n; ++i) {
             const Int x = integerAt(a, aS ? 0 : i);
             const Int mask = Int(1) << static_cast<int>(countAt(bit, bS ? 0 : i) - 1);
@@ -584,18 +591,15 @@ private:
         if (x.sparse || k.sparse) refuse("VESPRA:bitshift:sparseArgs");
         if (isComplex(x) || isComplex(k)) refuse("VESPRA:bitshift:complexArgs");
         const bool xS = isScalar(x), kS = isScalar(k);
-        if (!xS && !kS && shapeOf(x) != shapeOf(k)) refuse("VESPRA:bitshift:sizeMismatch");
-        const Dims dims = xS ? shapeOf(k) : shapeOf(x);
+        const Dims dims = scalarOrSame(x, k, "VESPRA:bitshift:sizeMismatch");
         const zqClassID cls = type ? parseType(*type) : zqUInt64Class;
         Operand r = makeResult(x, !xS, zqDoubleClass, dims, true);
         if (!isInteger(cls)) refuse("VESPRA:bitshift:unknownTypeString");
         const std::size_t n = countOf(dims);
-        for (std::size_t i = 0; i < (xS ? 1 : n); ++i) {
-            if (!fits(realAt(x, i), cls)) refuse("VESPRA:bitshift:outOfRange");
-        }
-        for (std::size_t i = 0; i < (kS ? 1 : n); ++i) {
-            if (!isWhole(realAt(k, i))) refuse("VESPRA:bitshift:inputsMustBeIntegers");
-        }
+        scan(x, n, "VESPRA:bitshift:outOfRange",
+             [&](std::size_t i) { return fits(realAt(x, i), cls); });
+        scan(k, n, "VESPRA:bitshift:inputsMustBeIntegers",
+             [&](std::size_t i) { return isWhole(realAt(k, i)); });
         for (std::size_t i = 0; i < n; ++i) {
             const Int v = shifted(exact(realAt(x, xS ? 0 : i)), cls, countAt(k, kS ? 0 : i));
             putDouble(r, i, toDouble(v));
@@ -613,8 +617,7 @@ private:
         if (!isInteger(x.cls)) refuse("VESPRA:bitshift:firstArgNotInt");
         if (isComplex(x) || isComplex(k)) refuse("VESPRA:bitshift:complexArgs");
         const bool xS = isScalar(x), kS = isScalar(k);
-        if (!xS && !kS && shapeOf(x) != shapeOf(k)) refuse("VESPRA:bitshift:sizeMismatch");
-        const Dims dims = xS ? shapeOf(k) : shapeOf(x);
+        const Dims dims = scalarOrSame(x, k, "VESPRA:bitshift:sizeMismatch");
         if (type) {
             const zqClassID cls = parseType(*type);
             if (!cls) refuse("VESPRA:bitshift:unknownTypeString");
@@ -622,8 +625,9 @@ private:
         }
         Operand r = makeResult(x, !xS, x.cls, dims, true);
         const std::size_t n = countOf(dims);
-        for (std::size_t i = 0; !isInteger(k.cls) && i < (kS ? 1 : n); ++i) {
-            if (!isWhole(realAt(k, i))) refuse("VESPRA:bitshift:inputsMustBeIntegers");
+        if (!isInteger(k.cls)) {
+            scan(k, n, "VESPRA:bitshift:inputsMustBeIntegers",
+                 [&](std::size_t i) { return isWhole(realAt(k, i)); });
         }
         for (std::size_t i = 0; i < n; ++i) {
             put(r, i, shifted(integerAt(x, xS ? 0 : i), x.cls, countAt(k, kS ? 0 : i)));
