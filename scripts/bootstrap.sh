@@ -4,7 +4,7 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
-packages=(g++ cmake make libtbb-dev libboost-dev libgtest-dev libbenchmark-dev libedit-dev)
+packages=(g++ clang-14 libclang-rt-14-dev cmake make libtbb-dev libboost-dev libgtest-dev libbenchmark-dev libedit-dev)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q 'install ok installed' || missing+=("$p")
