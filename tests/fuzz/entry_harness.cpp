@@ -111,27 +111,14 @@ double drawDouble(Bytes& in, bool wild) {
     }
 }
 
-void drawInteger(Bytes& in, unsigned char* out, std::size_t size, bool wild) {
-    const unsigned kind = wild ? in.below(3) : 0;
-    if (kind == 0) {
-        const long small = drawTame(in);
-        std::memcpy(out, &small, size);  // little-endian: the low bytes
-        return;
-    }
-    if (kind == 1) {  // 0, all ones, the top bit alone, all but the top bit, and neighbours
-        static constexpr unsigned char lows[] = {0x00, 0xFF, 0x00, 0xFF, 0x01, 0xFE};
-        static constexpr unsigned char highs[] = {0x00, 0xFF, 0x80, 0x7F, 0x80, 0x7F};
-        const unsigned pick = in.below(6);
-        std::memset(out,
-                    pick == 2 || pick == 4   ? 0x00
-                    : pick == 3 || pick == 5 ? 0xFF
-                                             : lows[pick],
-                    size);
-        out[0] = lows[pick];
-        out[size - 1] = size == 1 ? lows[pick] : highs[pick];
-        return;
-    }
-    in.fill(out, size);
+// Wild integers: the bounds of the class, their neighbours, or any bits.
+void drawInteger(Bytes& in, unsigned char* out, std::size_t size, bool isSigned, bool wild) {
+    if (wild && in.oneIn(2)) return in.fill(out, size);
+    const unsigned long top = 1UL << (8 * size - 1), ones = top | (top - 1);
+    const unsigned long lowest = isSigned ? top : 0, highest = isSigned ? top - 1 : ones;
+    const unsigned long edges[] = {lowest, lowest + 1, highest, highest - 1};
+    const unsigned long bits = wild ? edges[in.below(4)] : static_cast<unsigned long>(drawTame(in));
+    std::memcpy(out, &bits, size);  // little-endian: the low bytes
 }
 
 // A type text: a spelling, its cut forms and near misses, edited now and then.
@@ -245,7 +232,7 @@ void fillElements(Bytes& in, Operand& op, std::size_t drawn, bool wild) {
                                               : u"int8u6x"[in.below(7)];
             std::memcpy(out, &unit, size);
         } else {
-            drawInteger(in, out, size, wild);
+            drawInteger(in, out, size, (op.cls - zqInt8Class) % 2 == 0, wild);
         }
     }
     // Large arrays repeat their first elements.
