@@ -31,7 +31,7 @@ while (($#)); do
 done
 ((${#targets[@]})) || targets=(bitand bitor bitxor bitcmp bitget bitset bitshift bitcalc)
 
-scripts/bootstrap.sh fuzz
+build=$(scripts/bootstrap.sh fuzz 2>&1) || { echo "$build" >&2; exit 1; }
 
 status=0
 for target in "${targets[@]}"; do

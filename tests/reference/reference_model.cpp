@@ -26,9 +26,6 @@ bool isNumericClass(zqClassID cls) {
 }
 int widthOf(zqClassID cls) { return 8 << ((cls - zqInt8Class) / 2); }
 bool isSigned(zqClassID cls) { return (cls - zqInt8Class) % 2 == 0; }
-Int highest(zqClassID cls) {
-    return (Int(1) << (isSigned(cls) ? widthOf(cls) - 1 : widthOf(cls))) - 1;
-}
 
 // `v` as a value of an integer class: its low bits, two's complement if signed.
 Int wrap(Int v, zqClassID cls) {
@@ -74,35 +71,25 @@ bool storedIs(const Operand& a, zqClassID cls) { return !a.opaque && a.cls == cl
 bool isNumeric(const Operand& a) { return isNumericClass(a.cls); }
 bool isComplex(const Operand& a) { return a.complex && isNumeric(a); }
 
-template <class T>
-T load(const Operand& a, std::size_t i) {
-    T value;
-    std::memcpy(&value, a.bytes.data() + i * sizeof(T), sizeof(T));
-    return value;
-}
-
 // Element `i` of an integer or logical operand.
 Int integerAt(const Operand& a, std::size_t i) {
-    switch (a.cls) {
-        case zqInt8Class: return load<signed char>(a, i);
-        case zqUInt8Class: return load<unsigned char>(a, i);
-        case zqInt16Class: return load<short>(a, i);
-        case zqUInt16Class: return load<unsigned short>(a, i);
-        case zqInt32Class: return load<int>(a, i);
-        case zqUInt32Class: return load<unsigned int>(a, i);
-        case zqInt64Class: return load<long>(a, i);
-        case zqUInt64Class: return load<unsigned long>(a, i);
-        default: return a.bytes[i] != 0;
-    }
+    if (!isInteger(a.cls)) return a.bytes[i] != 0;
+    unsigned long bits = 0;
+    std::memcpy(&bits, &a.bytes[i * elementSize(a.cls)], elementSize(a.cls));
+    return wrap(bits, a.cls);
 }
 
 // Element `i` as a double; integers rounded to the nearest double.
 double realAt(const Operand& a, std::size_t i) {
-    switch (a.cls) {
-        case zqDoubleClass: return load<double>(a, i);
-        case zqSingleClass: return load<float>(a, i);
-        default: return toDouble(integerAt(a, i));
+    if (a.cls == zqSingleClass) {
+        float x;
+        std::memcpy(&x, &a.bytes[i * 4], 4);
+        return x;
     }
+    if (a.cls != zqDoubleClass) return toDouble(integerAt(a, i));
+    double x;
+    std::memcpy(&x, &a.bytes[i * 8], 8);
+    return x;
 }
 
 bool truthAt(const Operand& a, std::size_t i) {
@@ -197,6 +184,15 @@ void scan(const Operand& a, std::size_t count, const char* id, Test valid) {
     }
 }
 
+// An array of class `cls` and sizes `dims`, its elements zero.
+Operand fresh(zqClassID cls, const Dims& dims) {
+    Operand a;
+    a.cls = cls;
+    a.dims = normalised(dims);
+    a.bytes.resize(countOf(a.dims) * elementSize(cls));
+    return a;
+}
+
 // The sizes of a result where only a scalar adapts to the other operand.
 Dims scalarOrSame(const Operand& a, const Operand& b, const char* sizeId) {
     if (!isScalar(a) && !isScalar(b) && shapeOf(a) != shapeOf(b)) refuse(sizeId);
@@ -255,10 +251,7 @@ private:
     // The result array: a shared copy of `first` if allowed and flagged.
     Operand makeResult(const Operand& first, bool mayShare, zqClassID cls, const Dims& dims,
                        bool intoSlot) {
-        Operand result;
-        result.cls = cls;
-        result.dims = normalised(dims);
-        result.bytes.resize(countOf(result.dims) * elementSize(cls));
+        Operand result = fresh(cls, dims);
         shares_ = mayShare && first.wantsShared;
         allocate(shares_ ? 0 : result.bytes.size());
         slotFilled_ = intoSlot;
@@ -270,11 +263,8 @@ private:
         if (a.cls == cls) return a;
         if (isComplex(a) && cls == zqLogicalClass) refuse("VESPRA:bsxfun:badOperands");
         allocate(countOf(a) * elementSize(cls), isComplex(a));
-        Operand& c = conversions_.emplace_back();
-        c.cls = cls;
+        Operand& c = conversions_.emplace_back(fresh(cls, shapeOf(a)));
         c.complex = isComplex(a);
-        c.dims = shapeOf(a);
-        c.bytes.resize(countOf(a) * elementSize(cls));
         for (std::size_t i = 0, n = countOf(a); i < n; ++i) {
             if (cls == zqDoubleClass) {
                 putDouble(c, i, realAt(a, i));
@@ -303,10 +293,7 @@ private:
             dims[d] = sizeIn(sa, d) == 1 ? sizeIn(sb, d) : sizeIn(sa, d);
         }
         allocate(countOf(dims) * elementSize(cls));
-        Operand r;
-        r.cls = cls;
-        r.dims = normalised(dims);
-        r.bytes.resize(countOf(dims) * elementSize(cls));
+        Operand r = fresh(cls, dims);
         const auto valueAt = [](const Operand& x, std::size_t i) {
             return x.cls == zqDoubleClass ? exact(realAt(x, i)) : integerAt(x, i);
         };
@@ -393,8 +380,7 @@ private:
             if (!isInteger(type)) refuse("VESPRA:bitcmp:unknownTypeString");
             if (!allFit(a, type)) refuse("VESPRA:bitcmp:outOfRange");
             for (std::size_t i = 0, n = countOf(a); i < n; ++i) {
-                const Int v = exact(realAt(a, i));
-                putDouble(r, i, toDouble(isSigned(type) ? -v - 1 : highest(type) - v));
+                putDouble(r, i, toDouble(wrap(~exact(realAt(a, i)), type)));
             }
             return finish(std::move(r));
         }
