@@ -1,6 +1,8 @@
 // Array records: sizes as the host shows them, refused creation, shared
-// copies and references outliving their source, alignment of the storage.
+// copies and references outliving their source, lent elements, alignment of
+// the storage.
 #include "host/array_factory.hpp"
+#include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
 
 #include <cstdint>
@@ -62,6 +64,35 @@ TEST_F(ArrayRecordTest, SharedCopySurvivesEitherDestructionOrder) {
     EXPECT_EQ(same.get(), array.get());
     array.reset();
     EXPECT_EQ(*static_cast<const double*>(same->data), 4.0);
+}
+
+// The lender gets its elements back once, when the last record reading them
+// goes, whichever that is; a record that can't be made gives them back too.
+TEST_F(ArrayRecordTest, LentElementsAreReadInPlaceAndGivenBackOnce) {
+    struct Lender {
+        int returns = 0;
+        static void giveBack(void* owner) noexcept { ++static_cast<Lender*>(owner)->returns; }
+    };
+    std::vector<short> elements{1, 2, 3, 4, 5, 6};
+    const unsigned long dims[] = {3, 2, 1};
+    Lender lender;
+    zqArraySlot lent = host::makeArrayOverLentElements(
+        zqInt16Class, dims, {elements.data(), &lender, Lender::giveBack});
+    EXPECT_EQ(lent->data, elements.data());
+    EXPECT_EQ(host::dimensions(*lent), (Dims{3, 2}));
+    EXPECT_TRUE(lent->flags & zqNumericFlag);
+    zqArraySlot copy(matrix::detail::shared_copy(lent.get()));
+    EXPECT_EQ(copy->data, elements.data());
+    lent.reset();
+    EXPECT_EQ(lender.returns, 0);
+    copy.reset();
+    EXPECT_EQ(lender.returns, 1);
+
+    host::failNextAllocations(1);
+    EXPECT_THROW(host::makeArrayOverLentElements(zqLogicalClass, {},
+                                                 {elements.data(), &lender, Lender::giveBack}),
+                 std::bad_alloc);
+    EXPECT_EQ(lender.returns, 2);
 }
 
 TEST_F(ArrayRecordTest, DataIsAlignedForEverySize) {
