@@ -23,7 +23,6 @@
 // Functions that the library doesn't define yet resolve to null; their calls
 // are not checked.
 __attribute__((weak)) void ondelBitGetFcn(int, zqArraySlot*, int, const zqArray_tag**);
-__attribute__((weak)) void ondelBitSetFcn(int, zqArraySlot*, int, const zqArray_tag**);
 __attribute__((weak)) void ondelBitShiftFcn(int, zqArraySlot*, int, const zqArray_tag**);
 
 namespace fuzzing {
