@@ -6,7 +6,7 @@ cd "$(dirname "$0")/.."
 
 packages=(g++ cmake make libtbb-dev libboost-dev libgtest-dev libbenchmark-dev libedit-dev)
 # The tests of the installed tree and of the Debian package.
-packages+=(pkg-config dpkg-dev)
+packages+=(pkg-config dpkg-dev file)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q 'install ok installed' || missing+=("$p")
