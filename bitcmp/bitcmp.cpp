@@ -2,7 +2,6 @@
 // the double path (validation of the assumed class, then BitcmpFtor<T>).
 #include "bitcmp/bitcmp_ftor.hpp"
 #include "bitfcns/entry_points.hpp"
-#include "engine/parallel_limits.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/array.hpp"
 #include "frame/assumed_type.hpp"
@@ -15,7 +14,7 @@
 namespace bitfcns {
 namespace {
 
-namespace errors = VESPRA::bitcmp;
+using errors = VESPRA::bitcmp;
 
 // The result: the operand's own storage where the host allows it, otherwise
 // a new real array of the operand's sizes and class `cls`.
@@ -54,8 +53,7 @@ void bitcmpDoubleDriver(const zqArray_tag* operand, zqArray_tag* result) {
     const double* in = dataOf<double>(operand);
     if (!allFitInteger<T>(in, n)) raiseError<errors::outOfRange>();
     runVectorOp(
-        bitfcnsOneInputVectorOp<double, BitcmpFtor<T>>{in, dataOf<double>(result), 1, n, {}},
-        limits::bitcmpOnDouble);
+        bitfcnsOneInputVectorOp<double, BitcmpFtor<T>>{in, dataOf<double>(result), 1, n, {}});
 }
 
 void bitcmpDoubleOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {

@@ -1,16 +1,25 @@
 // The six SIMD functor pairs: each SSE2 functor, which treats one 16-byte
 // register of elements, next to its scalar twin, which treats one element.
+// A twin computes exactly what its vector functor computes in each lane, for
+// every argument the pair can be given.
 //
 // A vector functor is used in two steps: `prepare<T>()` sets up the constant
-// registers of a run (the shift count, the zero register, the repeated mask)
-// and returns the operation on registers of T; the strided loops call it once
-// before their body. The choice of instructions by element width lives in
-// `prepare` alone. The twins are class templates on T and give the same bits
-// for the values that the callers pass.
+// registers of a run (the shift count, the repeated mask) and returns the
+// operation on registers of T; the strided loops call it once before their
+// body. The instructions by width come from sse2_lanes.hpp.
+//
+// Each vector functor also names the parallel limit of the one operator
+// family it serves, `parallelLimit<T>`, so that a record carrying it can only
+// run with that limit. Shift counts and bit indexes must be below the width
+// of T (a scalar shift by the width is undefined); debug builds assert it.
 #pragma once
+
+#include "engine/parallel_limits.hpp"
+#include "engine/sse2_lanes.hpp"
 
 #include <emmintrin.h>
 
+#include <cassert>
 #include <cstdint>
 #include <type_traits>
 
@@ -23,49 +32,26 @@ template <class T>
 using Widened =
     std::conditional_t<(sizeof(T) < 8), std::conditional_t<std::is_signed_v<T>, int, unsigned>, T>;
 
-// A shift count loaded into the low part of a register, as the SSE2 shifts by
-// register read it: all lanes move by the same count.
-inline __m128i shiftCountRegister(std::uint32_t count) noexcept {
-    return _mm_cvtsi32_si128(static_cast<int>(count));
-}
-
-// Each lane of T shifted right logically; 8-bit lanes go through 16-bit lanes,
-// zero-extended, and are packed back without saturating.
+// The same width, unsigned: what a logical shift works on.
 template <class T>
-__m128i logicalRightShift(__m128i v, __m128i count, __m128i zero) noexcept {
-    if constexpr (sizeof(T) == 1) {
-        const __m128i low = _mm_srl_epi16(_mm_unpacklo_epi8(v, zero), count);
-        const __m128i high = _mm_srl_epi16(_mm_unpackhi_epi8(v, zero), count);
-        return _mm_packus_epi16(low, high);
-    } else if constexpr (sizeof(T) == 2) {
-        return _mm_srl_epi16(v, count);
-    } else if constexpr (sizeof(T) == 4) {
-        return _mm_srl_epi32(v, count);
-    } else {
-        return _mm_srl_epi64(v, count);
-    }
-}
+using WidenedBits = std::make_unsigned_t<Widened<T>>;
 
-// All ones in each lane of T that is zero, for 8, 16 and 32-bit lanes.
 template <class T>
-__m128i laneIsZero(__m128i v, __m128i zero) noexcept {
-    if constexpr (sizeof(T) == 1) {
-        return _mm_cmpeq_epi8(v, zero);
-    } else if constexpr (sizeof(T) == 2) {
-        return _mm_cmpeq_epi16(v, zero);
-    } else {
-        static_assert(sizeof(T) == 4);
-        return _mm_cmpeq_epi32(v, zero);
-    }
+constexpr bool belowWidth(std::uint32_t count) {
+    return count < lanes::bitsOf<T>;
 }
 
 }  // namespace bitfcns
 
 namespace mu {
 
-// in1 AND in2.
+// in1 AND in2. Clears one bit in all elements, in1 being a broadcast
+// inverted mask.
 template <class T>
 struct IntBitandSSE2Ftor {
+    template <class U>
+    static constexpr unsigned long parallelLimit = bitfcns::limits::clearOneBit<U>;
+
     template <class U>
     requires std::is_same_v<U, T>
     auto prepare() const noexcept {
@@ -77,9 +63,12 @@ struct IntBitandFtor {
     T operator()(T a, T b) const noexcept { return static_cast<T>(a & b); }
 };
 
-// in1 OR in2.
+// in1 OR in2. Sets one bit in all elements, in1 being a broadcast mask.
 template <class T>
 struct IntBitorSSE2Ftor {
+    template <class U>
+    static constexpr unsigned long parallelLimit = bitfcns::limits::setOneBit<U>;
+
     template <class U>
     requires std::is_same_v<U, T>
     auto prepare() const noexcept {
@@ -99,19 +88,17 @@ namespace bitfcns {
 // zero, without a branch. 8, 16 and 32-bit elements.
 class IntBitsetSSE2Ftor {
 public:
+    template <class T>
+    static constexpr unsigned long parallelLimit = limits::setBitFromValues<T>;
+
     explicit IntBitsetSSE2Ftor(std::uint32_t bitIndex) noexcept : bitIndex_(bitIndex) {}
 
     template <class T>
     auto prepare() const noexcept {
-        static_assert(sizeof(T) <= 4, "no vector bitset for 64-bit elements");
-        // The mask, computed in 32 bits and repeated into every lane.
-        __m128i mask = _mm_cvtsi32_si128(static_cast<int>(1u << bitIndex_));
-        if constexpr (sizeof(T) == 1) mask = _mm_unpacklo_epi8(mask, mask);
-        if constexpr (sizeof(T) <= 2) mask = _mm_unpacklo_epi16(mask, mask);
-        mask = _mm_shuffle_epi32(mask, 0);
-        const __m128i zero = _mm_setzero_si128();
-        return [mask, zero](__m128i in1, __m128i in2) noexcept {
-            const __m128i isZero = laneIsZero<T>(in2, zero);
+        assert(belowWidth<T>(bitIndex_));
+        const __m128i mask = lanes::repeat<T>(1u << bitIndex_);
+        return [mask](__m128i in1, __m128i in2) noexcept {
+            const __m128i isZero = lanes::isZero<T>(in2);
             // NOT(z AND mask) AND ((NOT z AND mask) OR in1)
             const __m128i clearBits = _mm_and_si128(isZero, mask);
             const __m128i setBits = _mm_andnot_si128(isZero, mask);
@@ -127,7 +114,9 @@ private:
 template <class T, class W>
 class IntBitsetFtor {
 public:
-    explicit IntBitsetFtor(std::uint32_t bitIndex) noexcept : bitIndex_(bitIndex) {}
+    explicit IntBitsetFtor(std::uint32_t bitIndex) noexcept : bitIndex_(bitIndex) {
+        assert(belowWidth<T>(bitIndex));
+    }
 
     T operator()(T a, W v) const noexcept {
         using Mask = std::conditional_t<(sizeof(T) == 8), std::uint64_t, std::uint32_t>;
@@ -143,34 +132,16 @@ private:
 // in shifted left by the count, truncated to T. Signed and unsigned alike.
 class IntLeftShiftSSE2Ftor {
 public:
+    template <class T>
+    static constexpr unsigned long parallelLimit = limits::leftShift<T>;
+
     explicit IntLeftShiftSSE2Ftor(std::uint32_t count) noexcept : count_(count) {}
 
     template <class T>
     auto prepare() const noexcept {
-        if constexpr (sizeof(T) == 1) {
-            // Through 16-bit lanes: the extra 8 pushes the bits that leave the
-            // element out of the lane, the shift right by 8 brings it back.
-            const __m128i widenedCount = shiftCountRegister(count_ + 8);
-            const __m128i zero = _mm_setzero_si128();
-            return [widenedCount, zero](__m128i v) noexcept {
-                const __m128i low =
-                    _mm_srli_epi16(_mm_sll_epi16(_mm_unpacklo_epi8(v, zero), widenedCount), 8);
-                const __m128i high =
-                    _mm_srli_epi16(_mm_sll_epi16(_mm_unpackhi_epi8(v, zero), widenedCount), 8);
-                return _mm_packus_epi16(low, high);
-            };
-        } else {
-            const __m128i count = shiftCountRegister(count_);
-            return [count](__m128i v) noexcept {
-                if constexpr (sizeof(T) == 2) {
-                    return _mm_sll_epi16(v, count);
-                } else if constexpr (sizeof(T) == 4) {
-                    return _mm_sll_epi32(v, count);
-                } else {
-                    return _mm_sll_epi64(v, count);
-                }
-            };
-        }
+        assert(belowWidth<T>(count_));
+        const __m128i count = lanes::leftShiftCount<T>(count_);
+        return [count](__m128i v) noexcept { return lanes::shiftLeft<T>(v, count); };
     }
 
 private:
@@ -179,11 +150,12 @@ private:
 template <class T>
 class IntLeftShiftFtor {
 public:
-    explicit IntLeftShiftFtor(std::uint32_t count) noexcept : count_(count) {}
+    explicit IntLeftShiftFtor(std::uint32_t count) noexcept : count_(count) {
+        assert(belowWidth<T>(count));
+    }
 
     T operator()(T x) const noexcept {
-        using Bits = std::make_unsigned_t<Widened<T>>;
-        return static_cast<T>(static_cast<Bits>(static_cast<Widened<T>>(x)) << count_);
+        return static_cast<T>(static_cast<WidenedBits<T>>(static_cast<Widened<T>>(x)) << count_);
     }
 
 private:
@@ -194,29 +166,16 @@ private:
 // signed T. There is no vector form for signed 64-bit elements.
 class IntRightShiftSSE2Ftor {
 public:
+    template <class T>
+    static constexpr unsigned long parallelLimit = limits::rightShift<T>;
+
     explicit IntRightShiftSSE2Ftor(std::uint32_t count) noexcept : count_(count) {}
 
     template <class T>
     auto prepare() const noexcept {
-        static_assert(!(std::is_signed_v<T> && sizeof(T) == 8),
-                      "no vector arithmetic shift of 64-bit elements");
-        const __m128i count = shiftCountRegister(count_);
-        const __m128i zero = _mm_setzero_si128();
-        return [count, zero](__m128i v) noexcept {
-            if constexpr (sizeof(T) == 1 && std::is_signed_v<T>) {
-                // Sign-extended into 16-bit lanes by unpacking against the sign mask.
-                const __m128i sign = _mm_cmpgt_epi8(zero, v);
-                const __m128i low = _mm_sra_epi16(_mm_unpacklo_epi8(v, sign), count);
-                const __m128i high = _mm_sra_epi16(_mm_unpackhi_epi8(v, sign), count);
-                return _mm_packs_epi16(low, high);
-            } else if constexpr (sizeof(T) == 2 && std::is_signed_v<T>) {
-                return _mm_sra_epi16(v, count);
-            } else if constexpr (sizeof(T) == 4 && std::is_signed_v<T>) {
-                return _mm_sra_epi32(v, count);
-            } else {
-                return logicalRightShift<T>(v, count, zero);
-            }
-        };
+        assert(belowWidth<T>(count_));
+        const __m128i count = lanes::countRegister(count_);
+        return [count](__m128i v) noexcept { return lanes::shiftRight<T>(v, count); };
     }
 
 private:
@@ -225,7 +184,9 @@ private:
 template <class T>
 class IntRightShiftFtor {
 public:
-    explicit IntRightShiftFtor(std::uint32_t count) noexcept : count_(count) {}
+    explicit IntRightShiftFtor(std::uint32_t count) noexcept : count_(count) {
+        assert(belowWidth<T>(count));
+    }
 
     T operator()(T x) const noexcept {
         return static_cast<T>(static_cast<Widened<T>>(x) >> count_);
@@ -235,19 +196,21 @@ private:
     std::uint32_t count_;
 };
 
-// (in1 shifted right by the count) AND in2. The vector functor shifts
-// logically for every T and the twin arithmetically for signed T; they agree
-// for the one use there is, in2 equal to 1 and a count below the width of T.
+// (in1 shifted right logically by the count) AND in2, for signed T as well.
+// Reads one bit of each element, in2 being a broadcast 1.
 class IntRightShiftAndSSE2Ftor {
 public:
+    template <class T>
+    static constexpr unsigned long parallelLimit = limits::getOneBit<T>;
+
     explicit IntRightShiftAndSSE2Ftor(std::uint32_t count) noexcept : count_(count) {}
 
     template <class T>
     auto prepare() const noexcept {
-        const __m128i count = shiftCountRegister(count_);
-        const __m128i zero = _mm_setzero_si128();
-        return [count, zero](__m128i in1, __m128i in2) noexcept {
-            return _mm_and_si128(logicalRightShift<T>(in1, count, zero), in2);
+        assert(belowWidth<T>(count_));
+        const __m128i count = lanes::countRegister(count_);
+        return [count](__m128i in1, __m128i in2) noexcept {
+            return _mm_and_si128(lanes::shiftRightLogical<T>(in1, count), in2);
         };
     }
 
@@ -257,11 +220,14 @@ private:
 template <class T>
 class IntRightShiftAndFtor {
 public:
-    explicit IntRightShiftAndFtor(std::uint32_t count) noexcept : count_(count) {}
+    explicit IntRightShiftAndFtor(std::uint32_t count) noexcept : count_(count) {
+        assert(belowWidth<T>(count));
+    }
 
     T operator()(T in1, T in2) const noexcept {
-        return static_cast<T>((static_cast<Widened<T>>(in1) >> count_) &
-                              static_cast<Widened<T>>(in2));
+        using Bits = std::make_unsigned_t<T>;
+        return static_cast<T>(static_cast<Bits>(static_cast<Bits>(in1) >> count_) &
+                              static_cast<Bits>(in2));
     }
 
 private:

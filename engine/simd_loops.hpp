@@ -6,6 +6,7 @@
 #pragma once
 
 #include "engine/prefetch.hpp"
+#include "engine/sse2_lanes.hpp"
 
 #include <emmintrin.h>
 
@@ -17,7 +18,7 @@ namespace bitfcns {
 
 // Elements of T in one 16-byte register.
 template <class T>
-inline constexpr unsigned long lanesOf = 16 / sizeof(T);
+inline constexpr unsigned long lanesOf = lanes::count<T>;
 
 namespace simd_detail {
 
@@ -40,24 +41,30 @@ unsigned long headLength(unsigned long n, std::initializer_list<const T*> pointe
     return std::min(n, toBoundary);
 }
 
+// The count of a scalar loop, made opaque to the optimiser at each step. A
+// loop whose trip count can't be computed is left alone by the
+// auto-vectorizer, which would otherwise turn the twin's loops into
+// unaligned vector loads and stores, which the engine never makes.
+inline void keepScalar(unsigned long& n) noexcept { asm("" : "+r"(n)); }
+
 // The scalar twin over `n` elements, each pointer stepping by its stride and
-// left past the run. Kept out of the auto-vectorizer: it would turn these
-// loops into unaligned vector loads and stores, which the engine never makes.
+// left past the run.
 template <class T, class ScalarFtor>
-[[gnu::optimize("no-tree-vectorize")]] void scalarRun(T*& out, const T*& in,
-                                                      unsigned long outStride, unsigned long stride,
-                                                      unsigned long n,
-                                                      ScalarFtor scalarFtor) noexcept {
-    for (; n != 0; --n, out += outStride, in += stride) *out = scalarFtor(*in);
+void scalarRun(T*& out, const T*& in, unsigned long outStride, unsigned long stride,
+               unsigned long n, ScalarFtor scalarFtor) noexcept {
+    for (; n != 0; --n, out += outStride, in += stride) {
+        keepScalar(n);
+        *out = scalarFtor(*in);
+    }
 }
 template <class T, class ScalarFtor>
-[[gnu::optimize("no-tree-vectorize")]] void scalarRun(T*& out, const T*& in1, const T*& in2,
-                                                      unsigned long outStride,
-                                                      unsigned long stride1, unsigned long stride2,
-                                                      unsigned long n,
-                                                      ScalarFtor scalarFtor) noexcept {
-    for (; n != 0; --n, out += outStride, in1 += stride1, in2 += stride2)
+void scalarRun(T*& out, const T*& in1, const T*& in2, unsigned long outStride,
+               unsigned long stride1, unsigned long stride2, unsigned long n,
+               ScalarFtor scalarFtor) noexcept {
+    for (; n != 0; --n, out += outStride, in1 += stride1, in2 += stride2) {
+        keepScalar(n);
         *out = scalarFtor(*in1, *in2);
+    }
 }
 
 // An input read straight from memory, one aligned register per step.
@@ -110,9 +117,9 @@ void alignedBody(T* out, unsigned long blocks, VectorOp op, Inputs... inputs) no
 template <class T, class SimdFtor, class ScalarFtor>
 void unarySIMDApply(T* out, const T* in, unsigned long outStride, unsigned long stride,
                     unsigned long n, SimdFtor simdFtor, ScalarFtor scalarFtor) noexcept {
-    constexpr unsigned long lanes = lanesOf<T>;
+    constexpr unsigned long laneCount = lanesOf<T>;
     if (n == 0) return;
-    if (n < lanes || stride != 1 || outStride != 1) {
+    if (n < laneCount || stride != 1 || outStride != 1) {
         simd_detail::scalarRun(out, in, outStride, stride, n, scalarFtor);
         return;
     }
@@ -123,14 +130,14 @@ void unarySIMDApply(T* out, const T* in, unsigned long outStride, unsigned long 
     n -= head;
 
     // Body.
-    const unsigned long blocks = n / lanes;
+    const unsigned long blocks = n / laneCount;
     simd_detail::alignedBody(out, blocks, simdFtor.template prepare<T>(),
                              simd_detail::StreamedInput<T>(in));
-    out += blocks * lanes;
-    in += blocks * lanes;
+    out += blocks * laneCount;
+    in += blocks * laneCount;
 
     // Tail.
-    simd_detail::scalarRun(out, in, 1, 1, n % lanes, scalarFtor);
+    simd_detail::scalarRun(out, in, 1, 1, n % laneCount, scalarFtor);
 }
 
 // out[i * outStride] = scalarFtor(in1[i * stride1], in2[i * stride2]) for i
@@ -145,12 +152,12 @@ void binarySIMDApply(T* out, const T* in1, const T* in2, unsigned long outStride
                      SimdFtor simdFtor, ScalarFtor scalarFtor) noexcept {
     using simd_detail::BroadcastInput;
     using simd_detail::StreamedInput;
-    constexpr unsigned long lanes = lanesOf<T>;
+    constexpr unsigned long laneCount = lanesOf<T>;
     if (n == 0) return;
     const bool unitLoop = stride1 == 1 && stride2 == 1;
     const bool firstUnitLoop = stride1 == 1 && stride2 == 0;
     const bool secondUnitLoop = stride1 == 0 && stride2 == 1;
-    if (n < lanes || outStride != 1 || !(unitLoop || firstUnitLoop || secondUnitLoop)) {
+    if (n < laneCount || outStride != 1 || !(unitLoop || firstUnitLoop || secondUnitLoop)) {
         simd_detail::scalarRun(out, in1, in2, outStride, stride1, stride2, n, scalarFtor);
         return;
     }
@@ -164,7 +171,7 @@ void binarySIMDApply(T* out, const T* in1, const T* in2, unsigned long outStride
     n -= head;
 
     // Body.
-    const unsigned long blocks = n / lanes;
+    const unsigned long blocks = n / laneCount;
     const auto op = simdFtor.template prepare<T>();
     if (unitLoop)
         simd_detail::alignedBody(out, blocks, op, StreamedInput<T>(in1), StreamedInput<T>(in2));
@@ -172,12 +179,12 @@ void binarySIMDApply(T* out, const T* in1, const T* in2, unsigned long outStride
         simd_detail::alignedBody(out, blocks, op, StreamedInput<T>(in1), BroadcastInput<T>(in2));
     else
         simd_detail::alignedBody(out, blocks, op, BroadcastInput<T>(in1), StreamedInput<T>(in2));
-    out += blocks * lanes;
-    in1 += blocks * lanes * stride1;
-    in2 += blocks * lanes * stride2;
+    out += blocks * laneCount;
+    in1 += blocks * laneCount * stride1;
+    in2 += blocks * laneCount * stride2;
 
     // Tail.
-    simd_detail::scalarRun(out, in1, in2, 1, stride1, stride2, n % lanes, scalarFtor);
+    simd_detail::scalarRun(out, in1, in2, 1, stride1, stride2, n % laneCount, scalarFtor);
 }
 
 }  // namespace bitfcns

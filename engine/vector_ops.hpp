@@ -1,18 +1,20 @@
-// The five operator records of the vector engine and runVectorOp, which runs
-// a filled record on the calling thread below the limit of its family and
-// under tbb::parallel_for from the limit on. A record is a trivially copyable
-// structure of raw non-owning pointers, element strides (0 for a broadcast
-// scalar, 1 for an array), a count and functors; its call operator treats one
-// subrange [begin, end) and keeps no running state, so subranges may run
-// concurrently. The result is always written with unit stride.
+// The five operator records of the vector engine and runVectorOp. A record
+// is a trivially copyable structure of raw non-owning pointers, element
+// strides (0 for a broadcast scalar, 1 for an array), a count and functors;
+// its call operator treats one subrange [begin, end) and keeps no running
+// state, so subranges may run concurrently. The result is always written with
+// unit stride.
+//
+// Every record knows its parallel limit from its functor: a plain functor
+// names it as `parallelLimit`, a vector functor as `parallelLimit<T>`. So a
+// record runs with the limit of its own family and no other.
 #pragma once
 
+#include "engine/parallel_driver.hpp"
 #include "engine/prefetch.hpp"
 #include "engine/simd_loops.hpp"
 
 #include <tbb/blocked_range.h>
-#include <tbb/parallel_for.h>
-#include <tbb/partitioner.h>
 
 #include <type_traits>
 
@@ -23,6 +25,8 @@ using VectorRange = tbb::blocked_range<unsigned long>;
 // out[i] = ftor(in[i * stride]).
 template <class In, class Ftor>
 struct bitfcnsOneInputVectorOp {
+    static constexpr unsigned long parallelLimit = Ftor::parallelLimit;
+
     const In* in;
     In* out;
     unsigned long stride;
@@ -40,6 +44,8 @@ struct bitfcnsOneInputVectorOp {
 // out[i] = ftor(in1[i * stride1], in2[i * stride2]).
 template <class In1, class In2, class Ftor>
 struct bitfcnsTwoInputVectorOp {
+    static constexpr unsigned long parallelLimit = Ftor::parallelLimit;
+
     const In1* in1;
     const In2* in2;
     In1* out;
@@ -60,6 +66,8 @@ struct bitfcnsTwoInputVectorOp {
 // out[i] = ftor(in1[i * stride1], in2[i * stride2], in3[i * stride3]).
 template <class In1, class In2, class In3, class Ftor>
 struct bitfcnsThreeInputVectorOp {
+    static constexpr unsigned long parallelLimit = Ftor::parallelLimit;
+
     const In1* in1;
     const In2* in2;
     const In3* in3;
@@ -84,6 +92,8 @@ struct bitfcnsThreeInputVectorOp {
 // subrange does its own alignment peel and tail.
 template <class T, class SimdFtor, class ScalarFtor>
 struct bitfcnsUnarySIMDVectorOp {
+    static constexpr unsigned long parallelLimit = SimdFtor::template parallelLimit<T>;
+
     const T* in;
     T* out;
     unsigned long stride;
@@ -101,6 +111,8 @@ struct bitfcnsUnarySIMDVectorOp {
 // binarySIMDApply; each subrange does its own alignment peel and tail.
 template <class T, class SimdFtor, class ScalarFtor>
 struct bitfcnsBinarySIMDVectorOp {
+    static constexpr unsigned long parallelLimit = SimdFtor::template parallelLimit<T>;
+
     const T* in1;
     const T* in2;
     T* out;
@@ -117,21 +129,21 @@ struct bitfcnsBinarySIMDVectorOp {
     }
 };
 
-// Runs a filled record over [0, n): one call on the calling thread when n is
-// below `limit`, which creates no task and allocates nothing; otherwise
-// tbb::parallel_for with the record as body, copied by value into its tasks,
-// and the splitting left to the auto partitioner. Throws only what the
-// scheduler throws when it can't create its root task.
+// The range body of a record type: the record's call operator on
+// [begin, end).
 template <class VectorOp>
-void runVectorOp(const VectorOp& op, unsigned long limit) {
-    static_assert(std::is_trivially_copyable_v<VectorOp>, "a record is copied into tasks by value");
-    const VectorRange whole(0, op.n);
-    if (op.n < limit) {
-        op(whole);
-        return;
-    }
-    const tbb::auto_partitioner partitioner;
-    tbb::parallel_for(whole, op, partitioner);
+void runRecordRange(const void* record, unsigned long begin, unsigned long end) noexcept {
+    (*static_cast<const VectorOp*>(record))(VectorRange(begin, end));
+}
+
+// Runs a filled record over [0, n) through the parallel driver, with the
+// limit of its family: serially on the calling thread below it, under
+// tbb::parallel_for from it. The record stays on the caller's stack for the
+// whole run, and every subrange reads it there.
+template <class VectorOp>
+void runVectorOp(const VectorOp& op) {
+    static_assert(std::is_trivially_copyable_v<VectorOp>, "a record holds no owning member");
+    runInRanges(op.n, VectorOp::parallelLimit, &runRecordRange<VectorOp>, &op);
 }
 
 }  // namespace bitfcns

@@ -1,9 +1,11 @@
 // Message identifiers: one tag class per identifier, derived from the host's
-// message record. `MessageTag<Group, Leaf>` lets generic code name any tag by
-// its group and leaf; the namespaces below give each of the library's 65
-// identifiers its own name, as in VESPRA::bitshift::sizeMismatch.
+// message record, and one type per group that names its tags. A raising site
+// names a tag through its group, as in VESPRA::bitshift::sizeMismatch, so a
+// misspelt leaf doesn't compile; each group's `Tags` lists its tags once more
+// for code that walks the whole catalogue.
 #pragma once
 
+#include "frame/class_types.hpp"
 #include "host/exceptions.hpp"
 
 #include <algorithm>
@@ -22,11 +24,11 @@ struct FixedString {
     constexpr std::string_view view() const { return {text, N - 1}; }
 };
 
-// The tag of the identifier "Group:Leaf". Messages of this library take no
-// arguments.
-template <FixedString Group, FixedString Leaf>
+// The tag of the identifier "Group:Leaf", for a group type that holds its
+// full name as `name`. Messages of this library take no arguments.
+template <class Group, FixedString Leaf>
 struct MessageTag : resource_core::BaseMsgID {
-    MessageTag() : BaseMsgID(std::string(Group.view()), std::string(Leaf.view()), 0) {}
+    MessageTag() : BaseMsgID(std::string(Group::name.view()), std::string(Leaf.view()), 0) {}
 };
 
 }  // namespace bitfcns
@@ -34,125 +36,105 @@ struct MessageTag : resource_core::BaseMsgID {
 // The groups differ in the case of their first letter; they are exact.
 namespace VESPRA {
 
-namespace Bitand {
-inline constexpr bitfcns::FixedString group = "VESPRA:Bitand";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using sparseArgs = Tag<"sparseArgs">;
-using operandsNotNumeric = Tag<"operandsNotNumeric">;
-using complexInputs = Tag<"complexInputs">;
-using firstArgsNotInt = Tag<"firstArgsNotInt">;
-using sizeMismatch = Tag<"sizeMismatch">;
-using mixedClasses = Tag<"mixedClasses">;
-using unknownTypeString = Tag<"unknownTypeString">;
-using invalidTypeString = Tag<"invalidTypeString">;
-using outOfRangeMixedType = Tag<"outOfRangeMixedType">;
-using outOfRange = Tag<"outOfRange">;
-}  // namespace Bitand
+using bitfcns::MessageTag;
 
-namespace Bitor {
-inline constexpr bitfcns::FixedString group = "VESPRA:Bitor";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using sparseArgs = Tag<"sparseArgs">;
-using operandsNotNumeric = Tag<"operandsNotNumeric">;
-using complexInputs = Tag<"complexInputs">;
-using firstArgsNotInt = Tag<"firstArgsNotInt">;
-using sizeMismatch = Tag<"sizeMismatch">;
-using mixedClasses = Tag<"mixedClasses">;
-using unknownTypeString = Tag<"unknownTypeString">;
-using invalidTypeString = Tag<"invalidTypeString">;
-using outOfRangeMixedType = Tag<"outOfRangeMixedType">;
-using outOfRange = Tag<"outOfRange">;
-}  // namespace Bitor
+// The leaves that bitand, bitor and bitxor share, each under its own group.
+template <bitfcns::FixedString Name>
+struct LogicGroup {
+    static constexpr bitfcns::FixedString name = Name;
+    using sparseArgs = MessageTag<LogicGroup, "sparseArgs">;
+    using operandsNotNumeric = MessageTag<LogicGroup, "operandsNotNumeric">;
+    using complexInputs = MessageTag<LogicGroup, "complexInputs">;
+    using firstArgsNotInt = MessageTag<LogicGroup, "firstArgsNotInt">;
+    using sizeMismatch = MessageTag<LogicGroup, "sizeMismatch">;
+    using mixedClasses = MessageTag<LogicGroup, "mixedClasses">;
+    using unknownTypeString = MessageTag<LogicGroup, "unknownTypeString">;
+    using invalidTypeString = MessageTag<LogicGroup, "invalidTypeString">;
+    using outOfRangeMixedType = MessageTag<LogicGroup, "outOfRangeMixedType">;
+    using outOfRange = MessageTag<LogicGroup, "outOfRange">;
+    using Tags = bitfcns::TypeList<sparseArgs, operandsNotNumeric, complexInputs, firstArgsNotInt,
+                                   sizeMismatch, mixedClasses, unknownTypeString, invalidTypeString,
+                                   outOfRangeMixedType, outOfRange>;
+};
+using Bitand = LogicGroup<"VESPRA:Bitand">;
+using Bitor = LogicGroup<"VESPRA:Bitor">;
+using bitxor = LogicGroup<"VESPRA:bitxor">;
 
-namespace bitxor {
-inline constexpr bitfcns::FixedString group = "VESPRA:bitxor";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using sparseArgs = Tag<"sparseArgs">;
-using operandsNotNumeric = Tag<"operandsNotNumeric">;
-using complexInputs = Tag<"complexInputs">;
-using firstArgsNotInt = Tag<"firstArgsNotInt">;
-using sizeMismatch = Tag<"sizeMismatch">;
-using mixedClasses = Tag<"mixedClasses">;
-using unknownTypeString = Tag<"unknownTypeString">;
-using invalidTypeString = Tag<"invalidTypeString">;
-using outOfRangeMixedType = Tag<"outOfRangeMixedType">;
-using outOfRange = Tag<"outOfRange">;
-}  // namespace bitxor
+struct bitcmp {
+    static constexpr bitfcns::FixedString name = "VESPRA:bitcmp";
+    using firstArgNotInt = MessageTag<bitcmp, "firstArgNotInt">;
+    using sparseArgs = MessageTag<bitcmp, "sparseArgs">;
+    using complexOperands = MessageTag<bitcmp, "complexOperands">;
+    using unknownTypeString = MessageTag<bitcmp, "unknownTypeString">;
+    using invalidTypeString = MessageTag<bitcmp, "invalidTypeString">;
+    using outOfRange = MessageTag<bitcmp, "outOfRange">;
+    using Tags = bitfcns::TypeList<firstArgNotInt, sparseArgs, complexOperands, unknownTypeString,
+                                   invalidTypeString, outOfRange>;
+};
 
-namespace bitcmp {
-inline constexpr bitfcns::FixedString group = "VESPRA:bitcmp";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using firstArgNotInt = Tag<"firstArgNotInt">;
-using sparseArgs = Tag<"sparseArgs">;
-using complexOperands = Tag<"complexOperands">;
-using unknownTypeString = Tag<"unknownTypeString">;
-using invalidTypeString = Tag<"invalidTypeString">;
-using outOfRange = Tag<"outOfRange">;
-}  // namespace bitcmp
-
-namespace bitget {
-inline constexpr bitfcns::FixedString group = "VESPRA:bitget";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using sparseArgs = Tag<"sparseArgs">;
-using numericArg = Tag<"numericArg">;
-using complexArgs = Tag<"complexArgs">;
-using sizeMismatch = Tag<"sizeMismatch">;
-using unknownTypeString = Tag<"unknownTypeString">;
-using invalidTypeString = Tag<"invalidTypeString">;
-using outOfRange = Tag<"outOfRange">;
-}  // namespace bitget
+struct bitget {
+    static constexpr bitfcns::FixedString name = "VESPRA:bitget";
+    using sparseArgs = MessageTag<bitget, "sparseArgs">;
+    using numericArg = MessageTag<bitget, "numericArg">;
+    using complexArgs = MessageTag<bitget, "complexArgs">;
+    using sizeMismatch = MessageTag<bitget, "sizeMismatch">;
+    using unknownTypeString = MessageTag<bitget, "unknownTypeString">;
+    using invalidTypeString = MessageTag<bitget, "invalidTypeString">;
+    using outOfRange = MessageTag<bitget, "outOfRange">;
+    using Tags = bitfcns::TypeList<sparseArgs, numericArg, complexArgs, sizeMismatch,
+                                   unknownTypeString, invalidTypeString, outOfRange>;
+};
 
 // Shared by bitget and bitset.
-namespace bitSetGet {
-inline constexpr bitfcns::FixedString group = "VESPRA:bitSetGet";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using firstArgNotInt = Tag<"firstArgNotInt">;
-using sizeMismatch = Tag<"sizeMismatch">;
-using BITOutOfRange = Tag<"BITOutOfRange">;
-}  // namespace bitSetGet
+struct bitSetGet {
+    static constexpr bitfcns::FixedString name = "VESPRA:bitSetGet";
+    using firstArgNotInt = MessageTag<bitSetGet, "firstArgNotInt">;
+    using sizeMismatch = MessageTag<bitSetGet, "sizeMismatch">;
+    using BITOutOfRange = MessageTag<bitSetGet, "BITOutOfRange">;
+    using Tags = bitfcns::TypeList<firstArgNotInt, sizeMismatch, BITOutOfRange>;
+};
 
-namespace bitset {
-inline constexpr bitfcns::FixedString group = "VESPRA:bitset";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using sparseArgs = Tag<"sparseArgs">;
-using numericArg = Tag<"numericArg">;
-using complexArgs = Tag<"complexArgs">;
-using invalidV = Tag<"invalidV">;
-using sizeMismatch = Tag<"sizeMismatch">;
-using unknownTypeString = Tag<"unknownTypeString">;
-using invalidTypeString = Tag<"invalidTypeString">;
-using outOfRange = Tag<"outOfRange">;
-}  // namespace bitset
+struct bitset {
+    static constexpr bitfcns::FixedString name = "VESPRA:bitset";
+    using sparseArgs = MessageTag<bitset, "sparseArgs">;
+    using numericArg = MessageTag<bitset, "numericArg">;
+    using complexArgs = MessageTag<bitset, "complexArgs">;
+    using invalidV = MessageTag<bitset, "invalidV">;
+    using sizeMismatch = MessageTag<bitset, "sizeMismatch">;
+    using unknownTypeString = MessageTag<bitset, "unknownTypeString">;
+    using invalidTypeString = MessageTag<bitset, "invalidTypeString">;
+    using outOfRange = MessageTag<bitset, "outOfRange">;
+    using Tags = bitfcns::TypeList<sparseArgs, numericArg, complexArgs, invalidV, sizeMismatch,
+                                   unknownTypeString, invalidTypeString, outOfRange>;
+};
 
-namespace bitshift {
-inline constexpr bitfcns::FixedString group = "VESPRA:bitshift";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using sparseArgs = Tag<"sparseArgs">;
-using numericArg = Tag<"numericArg">;
-using complexArgs = Tag<"complexArgs">;
-using firstArgNotInt = Tag<"firstArgNotInt">;
-using sizeMismatch = Tag<"sizeMismatch">;
-using unknownTypeString = Tag<"unknownTypeString">;
-using invalidTypeString = Tag<"invalidTypeString">;
-using outOfRange = Tag<"outOfRange">;
-using inputsMustBeIntegers = Tag<"inputsMustBeIntegers">;
-}  // namespace bitshift
+struct bitshift {
+    static constexpr bitfcns::FixedString name = "VESPRA:bitshift";
+    using sparseArgs = MessageTag<bitshift, "sparseArgs">;
+    using numericArg = MessageTag<bitshift, "numericArg">;
+    using complexArgs = MessageTag<bitshift, "complexArgs">;
+    using firstArgNotInt = MessageTag<bitshift, "firstArgNotInt">;
+    using sizeMismatch = MessageTag<bitshift, "sizeMismatch">;
+    using unknownTypeString = MessageTag<bitshift, "unknownTypeString">;
+    using invalidTypeString = MessageTag<bitshift, "invalidTypeString">;
+    using outOfRange = MessageTag<bitshift, "outOfRange">;
+    using inputsMustBeIntegers = MessageTag<bitshift, "inputsMustBeIntegers">;
+    using Tags =
+        bitfcns::TypeList<sparseArgs, numericArg, complexArgs, firstArgNotInt, sizeMismatch,
+                          unknownTypeString, invalidTypeString, outOfRange, inputsMustBeIntegers>;
+};
 
 // Errors of reading a text operand; thrown without the legacy report.
-namespace string {
-inline constexpr bitfcns::FixedString group = "VESPRA:string";
-template <bitfcns::FixedString Leaf>
-using Tag = bitfcns::MessageTag<group, Leaf>;
-using MustBeStringScalarOrCharacterVector = Tag<"MustBeStringScalarOrCharacterVector">;
-using MissingNotSupported = Tag<"MissingNotSupported">;
-}  // namespace string
+struct string {
+    static constexpr bitfcns::FixedString name = "VESPRA:string";
+    using MustBeStringScalarOrCharacterVector =
+        MessageTag<string, "MustBeStringScalarOrCharacterVector">;
+    using MissingNotSupported = MessageTag<string, "MissingNotSupported">;
+    using Tags = bitfcns::TypeList<MustBeStringScalarOrCharacterVector, MissingNotSupported>;
+};
+
+// Every group of the library.
+using Groups =
+    bitfcns::TypeList<Bitand, Bitor, bitxor, bitcmp, bitget, bitSetGet, bitset, bitshift, string>;
 
 }  // namespace VESPRA

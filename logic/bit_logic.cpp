@@ -46,7 +46,7 @@ bool sizesExpand(const zqArray_tag* first, const zqArray_tag* second) {
     return true;
 }
 
-template <FixedString Group, ElementRoutine elementRoutine>
+template <class Group, ElementRoutine elementRoutine>
 class BitLogicCall {
 public:
     BitLogicCall(int nrhs, const zqArray_tag** prhs)
@@ -55,25 +55,25 @@ public:
     // Runs the tests in their fixed order and computes the result; `plhs[0]`
     // is written last, so a refused call leaves it as it was.
     void run(zqArraySlot* plhs) {
-        if (isSparse(first_) || isSparse(second_)) fail<"sparseArgs">();
+        if (isSparse(first_) || isSparse(second_)) fail<typename Group::sparseArgs>();
         if (!isNumericOrLogical(first_) || !isNumericOrLogical(second_))
-            fail<"operandsNotNumeric">();
-        if (isComplex(first_) || isComplex(second_)) fail<"complexInputs">();
+            fail<typename Group::operandsNotNumeric>();
+        if (isComplex(first_) || isComplex(second_)) fail<typename Group::complexInputs>();
         const Kind firstKind = kindOf(first_);
         const Kind secondKind = kindOf(second_);
         if ((firstKind == Kind::real32 && secondKind != Kind::integer) ||
             (secondKind == Kind::real32 && firstKind != Kind::integer)) {
-            fail<"firstArgsNotInt">();
+            fail<typename Group::firstArgsNotInt>();
         }
         const bool firstIsScalar = isScalar(first_);
         const bool secondIsScalar = isScalar(second_);
-        if (!sizesExpand(first_, second_)) fail<"sizeMismatch">();
+        if (!sizesExpand(first_, second_)) fail<typename Group::sizeMismatch>();
 
         if (firstKind == Kind::integer || secondKind == Kind::integer) {
             const bool allowed = firstKind == Kind::integer
                                      ? integerPartnerAllowed(secondKind, secondIsScalar)
                                      : integerPartnerAllowed(firstKind, firstIsScalar);
-            if (!allowed) fail<"mixedClasses">();
+            if (!allowed) fail<typename Group::mixedClasses>();
             *plhs = onIntegers(firstKind == Kind::integer ? classOf(first_) : classOf(second_));
         } else {
             *plhs = onDoublesAndLogicals(firstKind, secondKind);
@@ -81,9 +81,9 @@ public:
     }
 
 private:
-    template <FixedString Leaf>
+    template <class Tag>
     [[noreturn]] static void fail() {
-        raiseError<MessageTag<Group, Leaf>>();
+        raiseError<Tag>();
     }
 
     static bool isNumericOrLogical(const zqArray_tag* array) {
@@ -104,12 +104,12 @@ private:
     zqArraySlot onIntegers(zqClassID integerClass) const {
         if (assumedType_ != nullptr) {
             const zqClassID assumed = parseAssumedType(assumedType_);
-            if (assumed == zqNoClass) fail<"unknownTypeString">();
-            if (assumed != integerClass) fail<"invalidTypeString">();
+            if (assumed == zqNoClass) fail<typename Group::unknownTypeString>();
+            if (assumed != integerClass) fail<typename Group::invalidTypeString>();
         }
         for (const zqArray_tag* operand : {first_, second_}) {
             if (kindOf(operand) == Kind::real64 && !fitsIntegerClass(operand, integerClass)) {
-                fail<"outOfRangeMixedType">();
+                fail<typename Group::outOfRangeMixedType>();
             }
         }
         return elementRoutine(first_, second_);
@@ -126,7 +126,7 @@ private:
             }
         } else {
             workClass = parseAssumedType(assumedType_);
-            if (workClass == zqNoClass) fail<"unknownTypeString">();
+            if (workClass == zqNoClass) fail<typename Group::unknownTypeString>();
         }
         const auto convertedFirst = validatedConversion(first_, firstKind, workClass);
         const auto convertedSecond = validatedConversion(second_, secondKind, workClass);
@@ -136,7 +136,8 @@ private:
 
     static boost::intrusive_ptr<zqArray_tag> validatedConversion(const zqArray_tag* operand,
                                                                  Kind kind, zqClassID workClass) {
-        if (kind == Kind::real64 && !fitsIntegerClass(operand, workClass)) fail<"outOfRange">();
+        if (kind == Kind::real64 && !fitsIntegerClass(operand, workClass))
+            fail<typename Group::outOfRange>();
         return matrix::convert_if_needed(operand, workClass);
     }
 
@@ -145,7 +146,7 @@ private:
     const zqArray_tag* assumedType_;
 };
 
-template <FixedString Group, ElementRoutine elementRoutine>
+template <class Group, ElementRoutine elementRoutine>
 void bitLogicFunction(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
     if (nlhs > 1) matrix::detail::error_maxlhs();
     if (nrhs > 3) matrix::detail::error_maxrhs();
@@ -157,13 +158,13 @@ void bitLogicFunction(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag**
 }  // namespace bitfcns
 
 void ondelBitAndFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
-    bitfcns::bitLogicFunction<VESPRA::Bitand::group, bitandBsxfunHelper>(nlhs, plhs, nrhs, prhs);
+    bitfcns::bitLogicFunction<VESPRA::Bitand, bitandBsxfunHelper>(nlhs, plhs, nrhs, prhs);
 }
 
 void ondelBitOrFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
-    bitfcns::bitLogicFunction<VESPRA::Bitor::group, bitorBsxfunHelper>(nlhs, plhs, nrhs, prhs);
+    bitfcns::bitLogicFunction<VESPRA::Bitor, bitorBsxfunHelper>(nlhs, plhs, nrhs, prhs);
 }
 
 void ondelBitXorFcn(int nlhs, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
-    bitfcns::bitLogicFunction<VESPRA::bitxor::group, bitxorBsxfunHelper>(nlhs, plhs, nrhs, prhs);
+    bitfcns::bitLogicFunction<VESPRA::bitxor, bitxorBsxfunHelper>(nlhs, plhs, nrhs, prhs);
 }

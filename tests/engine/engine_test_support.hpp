@@ -158,7 +158,6 @@ struct BitsetPair {
         return newBitValues<T>(n, 2);
     }
 };
-// Used with a second operand of 1 only, the one use for which the twins agree.
 struct RightShiftAndPair {
     template <class T>
     static auto vector(std::uint32_t p) {
@@ -174,7 +173,7 @@ struct RightShiftAndPair {
     }
     template <class T>
     static std::vector<T> secondValues(std::size_t n) {
-        return std::vector<T>(n, T(1));
+        return testValues<T>(n, 2);
     }
 };
 struct LeftShiftPair {

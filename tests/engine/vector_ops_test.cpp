@@ -1,8 +1,8 @@
-// The operator records and runVectorOp: one serial call over the whole range
-// just below a family's limit, subranges from the limit on, bit-identical
-// results either way (also with an output that is the data operand, and on
-// one thread), and the three plain records with broadcast inputs.
-#include "engine/vector_ops.hpp"
+// The parallel driver, the SIMD families as the kernels run them, and the
+// plain records: one serial call below a limit, subranges covering the run
+// exactly once from it, and bit-identical elements either way (in place, on
+// one thread, at odd alignment).
+#include "engine/operator_families.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine_test_support.hpp"
 
@@ -17,34 +17,25 @@
 namespace bitfcns::test {
 namespace {
 
-// The calls a record received: ranges and whether any ran off the calling thread.
-struct CallLog {
+using Ranges = std::vector<std::pair<unsigned long, unsigned long>>;
+
+// Runs the driver with a body that records its subranges and whether any ran
+// off the calling thread.
+struct DriverLog {
     std::mutex mutex;
-    std::vector<std::pair<unsigned long, unsigned long>> ranges;
+    Ranges ranges;
     std::thread::id caller = std::this_thread::get_id();
     bool offCaller = false;
-};
 
-// A record that logs each subrange before handing it to the real one.
-template <class VectorOp>
-struct Logged {
-    VectorOp op;
-    unsigned long n;
-    CallLog* log;
-
-    void operator()(const VectorRange& range) const {
-        {
-            const std::lock_guard lock(log->mutex);
-            log->ranges.emplace_back(range.begin(), range.end());
-            log->offCaller = log->offCaller || std::this_thread::get_id() != log->caller;
-        }
-        op(range);
+    static void body(const void* context, unsigned long begin, unsigned long end) noexcept {
+        auto* log = const_cast<DriverLog*>(static_cast<const DriverLog*>(context));
+        const std::lock_guard lock(log->mutex);
+        log->ranges.emplace_back(begin, end);
+        log->offCaller = log->offCaller || std::this_thread::get_id() != log->caller;
     }
 };
 
-// True when the logged ranges cover [0, n) exactly once.
-bool coversExactlyOnce(std::vector<std::pair<unsigned long, unsigned long>> ranges,
-                       unsigned long n) {
+bool coversExactlyOnce(Ranges ranges, unsigned long n) {
     std::sort(ranges.begin(), ranges.end());
     unsigned long next = 0;
     for (const auto& [begin, end] : ranges) {
@@ -54,150 +45,131 @@ bool coversExactlyOnce(std::vector<std::pair<unsigned long, unsigned long>> rang
     return next == n;
 }
 
-// Where a family's callers put the data operand, and what goes beside it: a
-// broadcast constant (the plain or inverted mask, the 1 of bitget) or an
-// array of new bit values.
-enum class Layout { unary, dataThenConstant, constantThenData, dataThenValues };
-
-struct SetOneBit {
-    using Pair = BitorPair;
-    static constexpr Layout layout = Layout::constantThenData;
-    template <class T>
-    static constexpr unsigned long limit = limits::setOneBit<T>;
-    template <class T>
-    static T constant(std::uint32_t p) {
-        return T(std::uint64_t{1} << p);
+TEST(ParallelDriver, SerialBelowTheLimitSplitFromIt) {
+    constexpr unsigned long limit = 5000;
+    {
+        DriverLog log;
+        runInRanges(limit - 1, limit, &DriverLog::body, &log);
+        EXPECT_EQ(log.ranges, (Ranges{{0, limit - 1}}));
+        EXPECT_FALSE(log.offCaller);
     }
-};
-struct ClearOneBit {
-    using Pair = BitandPair;
-    static constexpr Layout layout = Layout::constantThenData;
-    template <class T>
-    static constexpr unsigned long limit = limits::clearOneBit<T>;
-    template <class T>
-    static T constant(std::uint32_t p) {
-        return T(~(std::uint64_t{1} << p));
+    {
+        DriverLog log;
+        runInRanges(limit, limit, &DriverLog::body, &log);
+        EXPECT_TRUE(coversExactlyOnce(log.ranges, limit));
+        if (tbb::this_task_arena::max_concurrency() > 1) {
+            EXPECT_GT(log.ranges.size(), 1u);
+        }
     }
-};
-struct GetOneBit {
-    using Pair = RightShiftAndPair;
-    static constexpr Layout layout = Layout::dataThenConstant;
-    template <class T>
-    static constexpr unsigned long limit = limits::getOneBit<T>;
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(1);
-    }
-};
-struct SetBitFromValues {
-    using Pair = BitsetPair;
-    static constexpr Layout layout = Layout::dataThenValues;
-    template <class T>
-    static constexpr unsigned long limit = limits::setBitFromValues<T>;
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(0);
-    }
-};
-struct LeftShift {
-    using Pair = LeftShiftPair;
-    static constexpr Layout layout = Layout::unary;
-    template <class T>
-    static constexpr unsigned long limit = limits::leftShift<T>;
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(0);
-    }
-};
-struct RightShift {
-    using Pair = RightShiftPair;
-    static constexpr Layout layout = Layout::unary;
-    template <class T>
-    static constexpr unsigned long limit = limits::rightShift<T>;
-    template <class T>
-    static T constant(std::uint32_t) {
-        return T(0);
-    }
-};
-
-// The record of a family, filled as its callers fill it; `second` is the
-// constant or the new bit values.
-template <class Family, class T>
-auto familyRecord(T* out, const T* data, const T* second, unsigned long n, std::uint32_t p) {
-    const auto simd = Family::Pair::template vector<T>(p);
-    const auto scalar = Family::Pair::template scalar<T>(p);
-    if constexpr (Family::layout == Layout::unary) {
-        return bitfcnsUnarySIMDVectorOp<T, decltype(simd), decltype(scalar)>{data, out,  1,
-                                                                             n,    simd, scalar};
-    } else {
-        using Record = bitfcnsBinarySIMDVectorOp<T, decltype(simd), decltype(scalar)>;
-        if constexpr (Family::layout == Layout::constantThenData)
-            return Record{second, data, out, 0, 1, n, simd, scalar};
-        else if constexpr (Family::layout == Layout::dataThenConstant)
-            return Record{data, second, out, 1, 0, n, simd, scalar};
-        else
-            return Record{data, second, out, 1, 1, n, simd, scalar};
+    {
+        DriverLog log;
+        runInRanges(0, limit, &DriverLog::body, &log);
+        EXPECT_EQ(log.ranges, (Ranges{{0, 0}}));
     }
 }
 
-template <class Family, class T>
-T expectedElement(T a, T value, T constant, std::uint32_t p) {
-    using Pair = typename Family::Pair;
-    if constexpr (Family::layout == Layout::unary)
-        return Pair::expected(a, p);
-    else if constexpr (Family::layout == Layout::constantThenData)
-        return Pair::expected(constant, a, p);
-    else if constexpr (Family::layout == Layout::dataThenConstant)
-        return Pair::expected(a, constant, p);
-    else
-        return Pair::expected(a, value, p);
-}
+// Each family as its callers call it, with a plain reference for one
+// element; `values` are the new bit values where the family takes them.
+struct SetOneBitCase {
+    using Family = SetOneBit;
+    template <class T>
+    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
+        SetOneBit::run(out, data, 1, n, p);
+    }
+    template <class T>
+    static T expected(T a, T, std::uint32_t p) {
+        return BitorPair::expected(T(std::uint64_t{1} << p), a, p);
+    }
+};
+struct ClearOneBitCase {
+    using Family = ClearOneBit;
+    template <class T>
+    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
+        ClearOneBit::run(out, data, 1, n, p);
+    }
+    template <class T>
+    static T expected(T a, T, std::uint32_t p) {
+        return BitandPair::expected(T(~(std::uint64_t{1} << p)), a, p);
+    }
+};
+struct GetOneBitCase {
+    using Family = GetOneBit;
+    template <class T>
+    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
+        GetOneBit::run(out, data, 1, n, p);
+    }
+    template <class T>
+    static T expected(T a, T, std::uint32_t p) {
+        return RightShiftAndPair::expected(a, T(1), p);
+    }
+};
+struct SetBitFromValuesCase {
+    using Family = SetBitFromValues;
+    template <class T>
+    static void run(T* out, const T* data, const T* values, unsigned long n, std::uint32_t p) {
+        SetBitFromValues::run(out, data, 1, values, 1, n, p);
+    }
+    template <class T>
+    static T expected(T a, T v, std::uint32_t p) {
+        return BitsetPair::expected(a, v, p);
+    }
+};
+struct LeftShiftCase {
+    using Family = LeftShift;
+    template <class T>
+    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
+        LeftShift::run(out, data, 1, n, p);
+    }
+    template <class T>
+    static T expected(T a, T, std::uint32_t p) {
+        return LeftShiftPair::expected(a, p);
+    }
+};
+struct RightShiftCase {
+    using Family = RightShift;
+    template <class T>
+    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
+        RightShift::run(out, data, 1, n, p);
+    }
+    template <class T>
+    static T expected(T a, T, std::uint32_t p) {
+        return RightShiftPair::expected(a, p);
+    }
+};
 
-// Runs a family through runVectorOp over n elements, the data starting one
-// element past a register boundary, and checks every element and the calls.
-template <class Family, class T>
-void checkFamilyRun(const std::vector<T>& data, const std::vector<T>& values, unsigned long n,
-                    bool inPlace, bool expectSplit) {
-    const std::uint32_t parameter = bitsOf<T> - 1 - static_cast<std::uint32_t>(n % 3);
+// A family's run over n elements that start one element past a register
+// boundary, checked element by element against the reference.
+template <class Case, class T>
+void checkRun(const std::vector<T>& data, const std::vector<T>& values, unsigned long n,
+              bool inPlace) {
+    const std::uint32_t p = bitsOf<T> - 1 - static_cast<std::uint32_t>(n % 3);
     AlignedBuffer<T> dataBuffer(n + 1), outBuffer(n + 1);
     T* const dataAt = dataBuffer.data() + 1;
     std::copy_n(data.begin(), n, dataAt);
     T* const out = inPlace ? dataAt : outBuffer.data() + 1;
-    const T constant = Family::template constant<T>(parameter);
-    const T* second = Family::layout == Layout::dataThenValues ? values.data() : &constant;
-
-    const unsigned long limit = Family::template limit<T>;
-    CallLog log;
-    runVectorOp(Logged{familyRecord<Family>(out, dataAt, second, n, parameter), n, &log}, limit);
-
+    Case::run(out, dataAt, values.data(), n, p);
     unsigned long i = 0;
-    while (i < n && out[i] == expectedElement<Family>(data[i], values[i], constant, parameter)) ++i;
-    ASSERT_EQ(i, n) << "first wrong element of " << n;
-    if (n < limit) {
-        ASSERT_EQ(log.ranges.size(), 1u);
-        EXPECT_EQ(log.ranges[0], std::make_pair(0ul, n));
-        EXPECT_FALSE(log.offCaller);
-    } else {
-        EXPECT_TRUE(coversExactlyOnce(log.ranges, n));
-        if (expectSplit) {
-            EXPECT_GT(log.ranges.size(), 1u);
-        }
-    }
+    while (i < n && out[i] == Case::expected(data[i], values[i], p)) ++i;
+    ASSERT_EQ(i, n) << "first wrong element of " << n << (inPlace ? ", in place" : "");
 }
 
-template <class Family, class T>
-void checkFamilyAtLimit() {
-    const unsigned long limit = Family::template limit<T>;
+// Just below and at the family's limit, in place or not, on all threads and
+// on one.
+template <class Case, class T>
+void checkAroundLimit() {
+    using Record = typename Case::Family::template Record<T>;
+    const unsigned long limit = Record::parallelLimit;
     const std::vector<T> data = testValues<T>(limit, 5);
     const std::vector<T> values = newBitValues<T>(limit, 6);
-    for (bool inPlace : {false, true}) {
-        SCOPED_TRACE(inPlace ? "in place" : "separate output");
-        const bool manyThreads = tbb::this_task_arena::max_concurrency() > 1;
-        checkFamilyRun<Family>(data, values, limit - 1, inPlace, false);
-        checkFamilyRun<Family>(data, values, limit, inPlace, manyThreads);
-        const tbb::global_control oneThread(tbb::global_control::max_allowed_parallelism, 1);
-        checkFamilyRun<Family>(data, values, limit - 1, inPlace, false);
-        checkFamilyRun<Family>(data, values, limit, inPlace, false);
+    for (bool oneThread : {false, true}) {
+        std::unique_ptr<tbb::global_control> control;
+        if (oneThread)
+            control = std::make_unique<tbb::global_control>(
+                tbb::global_control::max_allowed_parallelism, 1);
+        for (bool inPlace : {false, true}) {
+            checkRun<Case>(data, values, limit - 1, inPlace);
+            checkRun<Case>(data, values, limit, inPlace);
+        }
     }
 }
 
@@ -205,25 +177,25 @@ template <class T>
 class EveryWidthFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryWidthFamilies, AllIntegers);
 
-TYPED_TEST(EveryWidthFamilies, SetOneBit) { checkFamilyAtLimit<SetOneBit, TypeParam>(); }
-TYPED_TEST(EveryWidthFamilies, ClearOneBit) { checkFamilyAtLimit<ClearOneBit, TypeParam>(); }
-TYPED_TEST(EveryWidthFamilies, GetOneBit) { checkFamilyAtLimit<GetOneBit, TypeParam>(); }
-TYPED_TEST(EveryWidthFamilies, LeftShift) { checkFamilyAtLimit<LeftShift, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, SetOneBit) { checkAroundLimit<SetOneBitCase, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, ClearOneBit) { checkAroundLimit<ClearOneBitCase, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, GetOneBit) { checkAroundLimit<GetOneBitCase, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, LeftShift) { checkAroundLimit<LeftShiftCase, TypeParam>(); }
 
 template <class T>
 class RightShiftFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(RightShiftFamilies, RightShiftIntegers);
-
-TYPED_TEST(RightShiftFamilies, RightShift) { checkFamilyAtLimit<RightShift, TypeParam>(); }
+TYPED_TEST(RightShiftFamilies, RightShift) { checkAroundLimit<RightShiftCase, TypeParam>(); }
 
 template <class T>
 class BitsetFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(BitsetFamilies, BitsetIntegers);
+TYPED_TEST(BitsetFamilies, SetBitFromValues) {
+    checkAroundLimit<SetBitFromValuesCase, TypeParam>();
+}
 
-TYPED_TEST(BitsetFamilies, SetBitFromValues) { checkFamilyAtLimit<SetBitFromValues, TypeParam>(); }
-
-// Plain records: the same elements serially and when split down to single
-// elements (limit 1), with every input broadcast or not.
+// Plain records: the same elements in one serial call and split down to
+// single elements, with every input broadcast or not.
 struct WeightedSum {
     unsigned long operator()(unsigned long a) const { return 3 * a + 1; }
     unsigned long operator()(unsigned long a, short b) const {
@@ -234,29 +206,34 @@ struct WeightedSum {
     }
 };
 
+template <class Record>
+void runWithLimit(const Record& record, unsigned long limit) {
+    runInRanges(record.n, limit, &runRecordRange<Record>, &record);
+}
+
 TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
     constexpr unsigned long n = 1001;
     const std::vector<unsigned long> a = testValues<unsigned long>(n, 7);
-    std::vector<short> b = testValues<short>(n, 8);
+    const std::vector<short> b = testValues<short>(n, 8);
     const std::unique_ptr<bool[]> flags(new bool[n]);
     for (unsigned long i = 0; i < n; ++i) flags[i] = i % 3 == 0;
 
     for (unsigned long s1 : {0ul, 1ul})
         for (unsigned long s2 : {0ul, 1ul})
             for (unsigned long s3 : {0ul, 1ul})
-                for (unsigned long limit : {n + 1, n, 1ul}) {
+                for (unsigned long limit : {n + 1, 1ul}) {
                     SCOPED_TRACE(testing::Message()
                                  << "strides " << s1 << s2 << s3 << " limit " << limit);
                     std::vector<unsigned long> one(n), two(n), three(n);
-                    runVectorOp(
+                    runWithLimit(
                         bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{
                             a.data(), one.data(), s1, n, {}},
                         limit);
-                    runVectorOp(
+                    runWithLimit(
                         bitfcnsTwoInputVectorOp<unsigned long, short, WeightedSum>{
                             a.data(), b.data(), two.data(), s1, s2, n, {}},
                         limit);
-                    runVectorOp(
+                    runWithLimit(
                         bitfcnsThreeInputVectorOp<unsigned long, short, bool, WeightedSum>{
                             a.data(), b.data(), flags.get(), three.data(), s1, s2, s3, n, {}},
                         limit);
