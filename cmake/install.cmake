@@ -45,6 +45,39 @@ install(FILES ${PROJECT_SOURCE_DIR}/docs/bitcalc.1 DESTINATION ${CMAKE_INSTALL_M
 install(FILES ${PROJECT_SOURCE_DIR}/docs/guide.md ${PROJECT_SOURCE_DIR}/README.md
         DESTINATION ${CMAKE_INSTALL_DOCDIR})
 
+# The Python package (python/bitfcns with the extension bitfcns._core), where
+# the prefix's interpreter looks: Debian's own folder under /usr, the local
+# one under /usr/local, and site-packages under any other prefix, as for
+# `pip install --prefix`. The folder is chosen when installing, since
+# cmake --install --prefix and cpack choose the prefix only then.
+if(TARGET bitfcns_python)
+  execute_process(COMMAND ${Python_EXECUTABLE} -c
+                          "import sys; print('%d.%d;%d.%d' % (*sys.version_info[:2], \
+                                                              sys.version_info[0], \
+                                                              sys.version_info[1] + 1))"
+                  OUTPUT_VARIABLE bitfcns_python_versions OUTPUT_STRIP_TRAILING_WHITESPACE
+                  COMMAND_ERROR_IS_FATAL ANY)
+  list(GET bitfcns_python_versions 0 bitfcns_python_version)
+  list(GET bitfcns_python_versions 1 bitfcns_python_next_version)
+  install(CODE "
+    if(CMAKE_INSTALL_PREFIX STREQUAL \"/usr\")
+      set(BITFCNS_PYTHON_INSTALL_DIR lib/python3/dist-packages)
+    elseif(CMAKE_INSTALL_PREFIX STREQUAL \"/usr/local\")
+      set(BITFCNS_PYTHON_INSTALL_DIR lib/python${bitfcns_python_version}/dist-packages)
+    else()
+      set(BITFCNS_PYTHON_INSTALL_DIR lib/python${bitfcns_python_version}/site-packages)
+    endif()")
+  # Four folders below the prefix, wherever the package lands.
+  set_target_properties(bitfcns_python PROPERTIES
+                        INSTALL_RPATH "$ORIGIN/../../../../${CMAKE_INSTALL_LIBDIR}")
+  install(TARGETS bitfcns_python LIBRARY DESTINATION "\${BITFCNS_PYTHON_INSTALL_DIR}/bitfcns")
+  install(DIRECTORY ${PROJECT_SOURCE_DIR}/python/bitfcns/
+          DESTINATION "\${BITFCNS_PYTHON_INSTALL_DIR}/bitfcns" PATTERN __pycache__ EXCLUDE)
+  set(CPACK_DEBIAN_PACKAGE_DEPENDS
+      "python3 (>= ${bitfcns_python_version}~), python3 (<< ${bitfcns_python_next_version}), python3-numpy")
+  set(CPACK_DEBIAN_PACKAGE_SUGGESTS "python3-dask, python3-distributed")
+endif()
+
 # The CMake package.
 install(EXPORT bitfcnsTargets NAMESPACE bitfcns:: DESTINATION ${BITFCNS_INSTALL_CMAKEDIR})
 configure_package_config_file(${PROJECT_SOURCE_DIR}/cmake/bitfcnsConfig.cmake.in
@@ -59,6 +92,7 @@ install(FILES ${PROJECT_BINARY_DIR}/bitfcnsConfig.cmake
 # bitfcns.pc finds the prefix from its own place, so that it holds whatever
 # prefix the tree is installed to.
 file(RELATIVE_PATH bitfcns_pc_to_prefix /prefix/${CMAKE_INSTALL_LIBDIR}/pkgconfig /prefix)
+string(REGEX REPLACE "/$" "" bitfcns_pc_to_prefix "${bitfcns_pc_to_prefix}")
 configure_file(${PROJECT_SOURCE_DIR}/cmake/bitfcns.pc.in ${PROJECT_BINARY_DIR}/bitfcns.pc @ONLY)
 install(FILES ${PROJECT_BINARY_DIR}/bitfcns.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
 

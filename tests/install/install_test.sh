@@ -4,8 +4,10 @@
 # another with a plain compiler line from pkg-config, and the Python package
 # imports from the prefix's Python path when the build has one.
 set -euo pipefail
-build=${1:?usage: install_test.sh BUILD_DIR CXX}
-cxx=${2:?usage: install_test.sh BUILD_DIR CXX}
+usage="usage: install_test.sh BUILD_DIR CXX [PYTHON]"
+build=${1:?$usage}
+cxx=${2:?$usage}
+python=${3:-}  # the interpreter of the Python package, when the build has one
 here=$(cd "$(dirname "$0")" && pwd)
 scratch=$(mktemp -d)
 trap 'rm -rf "$scratch"' EXIT
@@ -37,3 +39,26 @@ export PKG_CONFIG_PATH=$prefix/lib/pkgconfig
 "$cxx" -std=c++20 -o "$scratch/pc-consumer" "$here/consumer/consumer.cpp" \
   $(pkg-config --cflags --libs bitfcns) -Wl,-rpath,"$(pkg-config --variable=libdir bitfcns)"
 "$scratch/pc-consumer"
+
+if [[ -n $python ]]; then
+  step "the Python package from the prefix's Python path"
+  site=$("$python" -c 'import sys, sysconfig
+print(sysconfig.get_path("platlib", "posix_prefix", {"base": sys.argv[1], "platbase": sys.argv[1]}))' "$prefix")
+  PYTHONPATH=$site "$python" - "$prefix" <<'EOF'
+import sys
+import numpy as np
+import bitfcns
+import bitfcns.dask
+
+assert bitfcns.__file__.startswith(sys.argv[1]), bitfcns.__file__
+row = np.array([12, 10, 255], np.uint8)
+calls = {"bitand": (10, [8, 10, 10]), "bitor": (3, [15, 11, 255]), "bitxor": (255, [243, 245, 0]),
+         "bitcmp": (None, [243, 245, 0]), "bitget": (3, [1, 0, 1]), "bitset": (1, [13, 11, 255]),
+         "bitshift": (-2, [3, 2, 63])}
+for name in bitfcns.available_functions():
+    second, expected = calls[name]
+    result = getattr(bitfcns, name)(row, *([] if second is None else [second]))
+    assert result.dtype == np.uint8 and result.tolist() == expected, (name, result)
+print("python   ok:", ", ".join(bitfcns.available_functions()))
+EOF
+fi
