@@ -71,18 +71,6 @@ void requireArithmeticOperand(const zqArray_tag& operand, std::string_view symbo
     }
 }
 
-zqClassID resultClassOf(zqClassID left, zqClassID right) {
-    if (host::isIntegerClass(left) && host::isIntegerClass(right) && left != right) {
-        throw CalcError(errorid::classMismatch,
-                        joinText("Integers of different classes can't be combined: ",
-                                 className(left), " with ", className(right), "."));
-    }
-    if (host::isIntegerClass(left)) return left;
-    if (host::isIntegerClass(right)) return right;
-    if (left == zqSingleClass || right == zqSingleClass) return zqSingleClass;
-    return zqDoubleClass;
-}
-
 // out[i] = combine(left[i * leftStride], right[i * rightStride]); a scalar
 // operand has the stride 0.
 template <class Tag>
@@ -103,6 +91,18 @@ void combineInto(zqArray_tag& result, BinaryOperator op, const zqArray_tag& left
 }
 
 }  // namespace
+
+zqClassID resultClassOf(zqClassID left, zqClassID right) {
+    if (host::isIntegerClass(left) && host::isIntegerClass(right) && left != right) {
+        throw CalcError(errorid::classMismatch,
+                        joinText("Integers of different classes can't be combined: ",
+                                 className(left), " with ", className(right), "."));
+    }
+    if (host::isIntegerClass(left)) return left;
+    if (host::isIntegerClass(right)) return right;
+    if (left == zqSingleClass || right == zqSingleClass) return zqSingleClass;
+    return zqDoubleClass;
+}
 
 zqArraySlot applyBinary(BinaryOperator op, const zqArray_tag& left, const zqArray_tag& right) {
     requireArithmeticOperand(left, symbolOf(op));

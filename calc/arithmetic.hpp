@@ -14,6 +14,11 @@ namespace bitcalc {
 // rounded half away from zero with saturation; ^ is element-wise too.
 zqArraySlot applyBinary(BinaryOperator op, const zqArray_tag& left, const zqArray_tag& right);
 
+// The class of the result of an operation on operands of these classes, by
+// the rule above; raises the evaluator's class mismatch for two integer
+// classes.
+zqClassID resultClassOf(zqClassID left, zqClassID right);
+
 // Unary minus or plus; logical and char operands become double.
 zqArraySlot applySign(UnaryOperator op, const zqArray_tag& operand);
 

@@ -123,13 +123,13 @@ std::optional<std::u16string> textOf(const zqArray_tag& array) {
     return std::nullopt;
 }
 
-double elementAsDouble(const zqArray_tag& array, std::size_t index) {
+long double elementValue(const zqArray_tag& array, std::size_t index) {
     return host::visitElementClass<host::StoredElements>(
         host::classOf(array),
         [&]<class Tag>(Tag) {
-            return static_cast<double>(elementsOf<typename Tag::type>(array)[index]);
+            return static_cast<long double>(elementsOf<typename Tag::type>(array)[index]);
         },
-        [] { return std::numeric_limits<double>::quiet_NaN(); });
+        [] { return std::numeric_limits<long double>::quiet_NaN(); });
 }
 
 }  // namespace bitcalc

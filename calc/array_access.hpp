@@ -58,7 +58,13 @@ T* mutableElementsOf(zqArray_tag& array) {
 // holds; nothing for any other array, a missing string included.
 std::optional<std::u16string> textOf(const zqArray_tag& array);
 
-// The real elements of an element-holding array, converted to double.
-double elementAsDouble(const zqArray_tag& array, std::size_t index);
+// A real element of an element-holding array, exactly: long double holds
+// every 64-bit integer. NaN for arrays of other classes.
+long double elementValue(const zqArray_tag& array, std::size_t index);
+
+// The same element rounded to double.
+inline double elementAsDouble(const zqArray_tag& array, std::size_t index) {
+    return static_cast<double>(elementValue(array, index));
+}
 
 }  // namespace bitcalc

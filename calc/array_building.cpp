@@ -10,6 +10,7 @@
 #include <cmath>
 #include <cstring>
 #include <limits>
+#include <type_traits>
 #include <vector>
 
 namespace bitcalc {
@@ -100,6 +101,8 @@ private:
     std::vector<zqArraySlot> cells_;
 };
 
+bool isWhole(long double value) { return value == std::floor(value); }
+
 bool isZeroByZero(const Dims& dims) { return dims.size() == 2 && dims[0] == 0 && dims[1] == 0; }
 
 Dims paddedTo(Dims dims, std::size_t count) {
@@ -139,7 +142,7 @@ zqArraySlot transposeArray(const zqArray_tag& source, bool conjugate) {
     const std::size_t columns = dims[1];
     const bool complex = host::isComplex(source);
     ElementWriter writer(host::classOf(source), {columns, rows}, complex);
-    for (std::size_t row = 0; row < rows; ++row) {
+    for (std::size_t row = 0; row < rows && columns != 0; ++row) {
         for (std::size_t column = 0; column < columns; ++column)
             writer.append(source, row + column * rows, 1);
     }
@@ -184,17 +187,21 @@ zqArraySlot concatenate(std::size_t dimension, std::span<const zqArray_tag* cons
                              dimension == 0 ? "vertically." : "horizontally."));
             }
         }
-        result[dimension] += dims[dimension];
+        if (__builtin_add_overflow(result[dimension], dims[dimension], &result[dimension])) {
+            throw CalcError(errorid::tooLarge, "The concatenated array is too large.");
+        }
         complex = complex || host::isComplex(*piece);
         sparse = sparse || host::isSparse(*piece);
     }
 
+    // The writer refuses sizes whose product overflows; with none of them 0,
+    // the products below are then exact. With one, nothing is copied.
+    ElementWriter writer(cls, result, complex);
     std::size_t inner = 1;
     for (std::size_t d = 0; d < dimension; ++d) inner *= result[d];
     std::size_t outer = 1;
     for (std::size_t d = dimension + 1; d < rank; ++d) outer *= result[d];
-
-    ElementWriter writer(cls, result, complex);
+    if (elementCountOf(result) == 0) outer = 0;
     for (std::size_t o = 0; o < outer; ++o) {
         for (const zqArray_tag* piece : kept) {
             const std::size_t block = inner * paddedTo(host::dimensions(*piece), rank)[dimension];
@@ -246,28 +253,41 @@ zqArraySlot filledArray(zqClassID cls, const Dims& dims, double value) {
     return array;
 }
 
-zqArraySlot rangeArray(double first, double step, double last) {
+zqArraySlot rangeArray(zqClassID cls, long double first, long double step, long double last) {
     if (!std::isfinite(first) || !std::isfinite(step) || !std::isfinite(last)) {
         throw CalcError(errorid::invalidArgument,
                         "The limits and the step of a range must be finite.");
     }
-    const double quotient = (last - first) / step;
-    const bool empty = step == 0 || !(quotient >= 0);
-    // A quotient a few units in the last place short of a whole number
+    // Whole numbers give an exact quotient. With fractions it may fall a few
+    // units in the last place short of the whole number it stands for, and
     // still reaches the last value: 0:0.1:0.3 has 4 elements.
-    const double steps =
-        empty ? -1 : std::floor(quotient * (1 + 4 * std::numeric_limits<double>::epsilon()));
-    if (steps + 1 > static_cast<double>(std::numeric_limits<unsigned long>::max() / 8)) {
+    const long double quotient = (last - first) / step;
+    const bool whole = isWhole(first) && isWhole(step) && isWhole(last);
+    const bool empty = step == 0 || !(quotient >= 0);
+    const long double steps =
+        empty ? -1
+              : std::floor(whole ? quotient
+                                 : quotient * (1 + 4 * std::numeric_limits<double>::epsilon()));
+    if (steps + 1 > static_cast<long double>(std::numeric_limits<unsigned long>::max() / 8)) {
         throw CalcError(errorid::tooLarge, "The range has too many elements.");
     }
     const auto count = static_cast<unsigned long>(steps + 1);
-    checkArraySize({1, count}, zqDoubleClass);
-    zqArraySlot array = host::makeArray(zqDoubleClass, {1, count});
-    double* values = mutableElementsOf<double>(*array);
-    for (unsigned long k = 0; k < count; ++k) {
-        const double value = first + static_cast<double>(k) * step;
-        values[k] = step > 0 ? std::min(value, last) : std::max(value, last);
-    }
+    checkArraySize({1, count}, cls);
+    zqArraySlot array = host::makeArray(cls, {1, count});
+    host::visitElementClass<host::NumericElements>(
+        cls,
+        [&]<class Tag>(Tag) {
+            using T = typename Tag::type;
+            using C = std::conditional_t<host::isIntegerElement<Tag>, long double, double>;
+            const C from = static_cast<C>(first), by = static_cast<C>(step),
+                    to = static_cast<C>(last);
+            T* values = mutableElementsOf<T>(*array);
+            for (unsigned long k = 0; k < count; ++k) {
+                const C value = from + static_cast<C>(k) * by;
+                values[k] = castElement<T>(by > 0 ? std::min(value, to) : std::max(value, to));
+            }
+        },
+        [] {});
     return array;
 }
 

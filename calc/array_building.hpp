@@ -40,8 +40,11 @@ zqArraySlot makeCell(const Dims& dims, std::span<const zqArray_tag* const> eleme
 // An array of class `cls` (numeric or logical) with every element `value`.
 zqArraySlot filledArray(zqClassID cls, const Dims& dims, double value);
 
-// The double row vector first, first + step, ... up to last.
-zqArraySlot rangeArray(double first, double step, double last);
+// The row vector first, first + step, ... up to last, of class `cls`
+// (double, single or an integer class). An integer range is computed in
+// long double, exact for 64-bit integers, and stored rounded and saturated;
+// others are computed in double.
+zqArraySlot rangeArray(zqClassID cls, long double first, long double step, long double last);
 
 // A 1-by-1 string array; an empty optional is the missing value.
 zqArraySlot stringScalar(std::optional<std::u16string> text);

@@ -223,6 +223,7 @@ zqArraySlot stringBody(const Builtin& self, std::span<Value> arguments) {
     if (dims.size() != 2) invalid(self, "takes a two-dimensional char array.");
     if (dims[0] == 0 && dims[1] == 0) return stringScalar(std::u16string());
     // Each row of the char array becomes one string.
+    checkArraySize({dims[0], 1}, zqStringClass);
     const char16_t* units = elementsOf<char16_t>(source);
     std::vector<std::optional<std::u16string>> rows;
     for (std::size_t row = 0; row < dims[0]; ++row) {

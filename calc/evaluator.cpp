@@ -5,7 +5,6 @@
 #include "calc/arithmetic.hpp"
 #include "calc/array_building.hpp"
 #include "calc/builtins.hpp"
-#include "calc/conversion.hpp"
 #include "calc/errors.hpp"
 #include "calc/parser.hpp"
 #include "calc/text_join.hpp"
@@ -41,8 +40,17 @@ struct CallArguments {
     }
 };
 
+// The pieces joined along `dimension` (0 for rows, 1 for columns), as a new
+// array; one piece alone needs no joining.
+Value joined(std::size_t dimension, std::vector<Value> pieces) {
+    if (pieces.size() == 1) return Value::fresh(std::move(pieces.front()).release());
+    std::vector<const zqArray_tag*> arrays;
+    for (const Value& piece : pieces) arrays.push_back(&piece.array());
+    return Value::fresh(concatenate(dimension, arrays));
+}
+
 // The one operand of a range: a real scalar, or an empty array.
-std::optional<double> rangeOperand(const zqArray_tag& array) {
+std::optional<long double> rangeOperand(const zqArray_tag& array) {
     const zqClassID cls = host::classOf(array);
     if (!holdsElements(cls) || host::isComplex(array)) {
         throw CalcError(
@@ -52,7 +60,7 @@ std::optional<double> rangeOperand(const zqArray_tag& array) {
     if (isEmpty(array)) return std::nullopt;
     if (!isScalar(array))
         throw CalcError(errorid::invalidArgument, "The operands of a range must be scalars.");
-    return elementAsDouble(array, 0);
+    return elementValue(array, 0);
 }
 
 }  // namespace
@@ -240,38 +248,69 @@ Value Evaluator::evaluate(const Expr& expr) {
 }
 
 Value Evaluator::evaluateArrayLiteral(const ArrayLiteral& literal) {
-    std::vector<std::vector<Value>> rows;
-    for (const auto& row : literal.rows) {
-        std::vector<Value> values;
-        for (const ExprPtr& element : row) values.push_back(evaluate(*element));
-        rows.push_back(std::move(values));
-    }
-    auto arraysOf = [](const std::vector<Value>& values) {
-        std::vector<const zqArray_tag*> arrays;
-        for (const Value& value : values) arrays.push_back(&value.array());
-        return arrays;
-    };
-
+    const std::size_t rowCount = literal.rowLengths.size();
+    const bool rowsAgree =
+        std::all_of(literal.rowLengths.begin(), literal.rowLengths.end(),
+                    [&](std::size_t length) { return length == literal.rowLengths.front(); });
+    ArrayLiteral::Cursor cursor(literal);
     if (literal.cell) {
-        if (rows.empty()) return Value::fresh(host::makeCellArray({0, 0}, {}));
-        const std::size_t columns = rows.front().size();
-        std::vector<const zqArray_tag*> elements(rows.size() * columns);
-        for (std::size_t r = 0; r < rows.size(); ++r) {
-            if (rows[r].size() != columns) {
-                throw CalcError(errorid::sizeMismatch,
-                                "The rows of a cell array must have one number of elements.");
-            }
-            for (std::size_t c = 0; c < columns; ++c)
-                elements[r + c * rows.size()] = &rows[r][c].array();
+        if (rowCount == 0) return Value::fresh(host::makeCellArray({0, 0}, {}));
+        std::vector<Value> values;
+        for (std::size_t i = 0; i < literal.isNumber.size(); ++i) {
+            values.push_back(cursor.atNumber()
+                                 ? Value::fresh(host::makeDoubleScalar(cursor.takeNumber()))
+                                 : evaluate(cursor.takeTree()));
         }
-        return Value::fresh(makeCell({rows.size(), columns}, elements));
+        if (!rowsAgree) {
+            throw CalcError(errorid::sizeMismatch,
+                            "The rows of a cell array must have one number of elements.");
+        }
+        const std::size_t columns = literal.rowLengths.front();
+        std::vector<const zqArray_tag*> elements(values.size());
+        for (std::size_t r = 0; r < rowCount; ++r) {
+            for (std::size_t c = 0; c < columns; ++c)
+                elements[r + c * rowCount] = &values[r * columns + c].array();
+        }
+        return Value::fresh(makeCell({rowCount, columns}, elements));
     }
 
-    if (rows.empty()) return Value::fresh(filledArray(zqDoubleClass, {0, 0}, 0));
-    std::vector<Value> joinedRows;
-    for (const std::vector<Value>& row : rows)
-        joinedRows.push_back(Value::fresh(concatenate(1, arraysOf(row))));
-    return Value::fresh(concatenate(0, arraysOf(joinedRows)));
+    if (rowCount == 0) return Value::fresh(filledArray(zqDoubleClass, {0, 0}, 0));
+    if (literal.trees.empty() && rowsAgree) {
+        // Numbers only: the matrix straight from them, column by column.
+        const std::size_t columns = literal.rowLengths.front();
+        zqArraySlot matrix = host::makeArray(zqDoubleClass, {rowCount, columns});
+        double* out = mutableElementsOf<double>(*matrix);
+        for (std::size_t r = 0; r < rowCount; ++r) {
+            for (std::size_t c = 0; c < columns; ++c)
+                out[r + c * rowCount] = literal.numbers[r * columns + c];
+        }
+        return Value::fresh(std::move(matrix));
+    }
+
+    // Each run of numbers in a row becomes one double row; the pieces of a
+    // row are joined, then the rows.
+    std::vector<Value> rows;
+    for (const std::size_t length : literal.rowLengths) {
+        std::vector<Value> pieces;
+        std::vector<double> run;
+        auto endRun = [&] {
+            if (run.empty()) return;
+            pieces.push_back(Value::fresh(
+                host::makeArray(zqDoubleClass, {1, run.size()}, std::span<const double>(run))));
+            run.clear();
+        };
+        for (std::size_t i = 0; i < length; ++i) {
+            if (cursor.atNumber()) {
+                run.push_back(cursor.takeNumber());
+            } else {
+                endRun();
+                pieces.push_back(evaluate(cursor.takeTree()));
+            }
+        }
+        endRun();
+        rows.push_back(joined(1, std::move(pieces)));
+    }
+    return joined(0, std::move(rows));
 }
 
 Value Evaluator::evaluateRange(const RangeExpr& range) {
@@ -279,25 +318,15 @@ Value Evaluator::evaluateRange(const RangeExpr& range) {
     const std::optional<Value> step =
         range.step ? std::optional<Value>(evaluate(*range.step)) : std::nullopt;
     const Value last = evaluate(*range.last);
-    const std::optional<double> from = rangeOperand(first.array());
-    const std::optional<double> by = step ? rangeOperand(step->array()) : 1.0;
-    const std::optional<double> to = rangeOperand(last.array());
-    if (!from || !by || !to) return Value::fresh(filledArray(zqDoubleClass, {1, 0}, 0));
-    zqArraySlot values = rangeArray(*from, *by, *to);
-
-    // An integer operand makes an integer range, a single one a single range.
-    zqClassID cls = zqDoubleClass;
-    for (const Value* operand : {&first, step ? &*step : nullptr, &last}) {
-        if (!operand) continue;
-        const zqClassID operandClass = host::classOf(operand->array());
-        if (host::isIntegerClass(operandClass)) {
-            cls = operandClass;
-            break;
-        }
-        if (operandClass == zqSingleClass) cls = zqSingleClass;
-    }
-    if (cls != zqDoubleClass) values = convertArray(*values, cls);
-    return Value::fresh(std::move(values));
+    const std::optional<long double> from = rangeOperand(first.array());
+    const std::optional<long double> by = step ? rangeOperand(step->array()) : 1.0L;
+    const std::optional<long double> to = rangeOperand(last.array());
+    // A range takes its class as arithmetic does: an integer operand makes an
+    // integer range, a single one a single range.
+    zqClassID cls = resultClassOf(host::classOf(first.array()), host::classOf(last.array()));
+    if (step) cls = resultClassOf(cls, host::classOf(step->array()));
+    if (!from || !by || !to) return Value::fresh(filledArray(cls, {1, 0}, 0));
+    return Value::fresh(rangeArray(cls, *from, *by, *to));
 }
 
 }  // namespace bitcalc

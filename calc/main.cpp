@@ -9,12 +9,16 @@
 #include "calc/parser.hpp"
 #include "calc/text_join.hpp"
 
+#include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
-#include <fstream>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
 #include <iostream>
 #include <optional>
-#include <sstream>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -54,8 +58,9 @@ Options:
 
 At a terminal, standard input is read with a prompt, line editing and
 history; an error there ends the rest of that input, not the session.
-Exit status: 0 when no error occurred, 1 when one did (or a golden case
-failed), 2 for a usage error.
+Exit status: 0 when no error occurred; 1 when one did, when the input can't
+be read or the output can't be written, or when a golden case failed or a
+case file holds none; 2 for a usage error.
 
 Statements are separated by line breaks, ';' or ','; a ';' after a statement
 keeps its value from being shown; '%' starts a comment; '...' continues a
@@ -116,27 +121,77 @@ int usageError(const std::string& problem) {
     return exitUsage;
 }
 
-std::optional<std::string> readFile(const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) return std::nullopt;
-    std::ostringstream content;
-    content << in.rdbuf();
-    return content.str();
+// Input that can't be read: a missing or unreadable file, a directory.
+struct InputError : std::runtime_error {
+    using std::runtime_error::runtime_error;
+};
+
+// All of an open file; `name` is for the error.
+std::string readAll(int fd, const std::string& name) {
+    auto failure = [&](int error) {
+        return InputError(bitcalc::joinText("can't read ", name, ": ", std::strerror(error)));
+    };
+    struct stat status {};
+    if (fstat(fd, &status) != 0) throw failure(errno);
+    if (S_ISDIR(status.st_mode)) throw failure(EISDIR);
+    std::string content;
+    char buffer[1 << 16];
+    for (;;) {
+        const ssize_t got = read(fd, buffer, sizeof buffer);
+        if (got == 0) return content;
+        if (got < 0) {
+            if (errno == EINTR) continue;
+            throw failure(errno);
+        }
+        content.append(buffer, static_cast<std::size_t>(got));
+    }
+}
+
+std::string readFile(const std::string& path) {
+    const int fd = open(path.c_str(), O_RDONLY | O_CLOEXEC);
+    if (fd < 0)
+        throw InputError(bitcalc::joinText("can't read ", path, ": ", std::strerror(errno)));
+    try {
+        std::string content = readAll(fd, path);
+        close(fd);
+        return content;
+    } catch (...) {
+        close(fd);
+        throw;
+    }
+}
+
+// Flushes standard output; a failed write (a full disk, a closed pipe) is
+// an error of the run, since output was lost.
+int finishOutput(int status) {
+    errno = 0;
+    std::cout.flush();
+    if (!std::cout || std::fflush(stdout) != 0 || std::ferror(stdout)) {
+        std::cerr << "bitcalc: can't write the output"
+                  << (errno != 0 ? bitcalc::joinText(": ", std::strerror(errno)) : "") << "\n";
+        return exitError;
+    }
+    return status;
 }
 
 int checkFiles(const std::vector<std::string>& files) {
     bool passed = true;
     for (const std::string& file : files) {
-        const std::optional<std::string> content = readFile(file);
-        if (!content) {
-            std::cerr << "bitcalc: can't read " << file << "\n";
+        try {
+            const bitcalc::GoldenResult result =
+                bitcalc::checkGoldenCases(readFile(file), file, std::cout);
+            if (result.cases == 0) {
+                std::cerr << "bitcalc: " << file << " holds no cases\n";
+                passed = false;
+                continue;
+            }
+            std::cout << file << ": " << result.cases - result.failures << " of " << result.cases
+                      << " cases passed\n";
+            passed = passed && result.failures == 0;
+        } catch (const InputError& error) {
+            std::cerr << "bitcalc: " << error.what() << "\n";
             passed = false;
-            continue;
         }
-        const bitcalc::GoldenResult result = bitcalc::checkGoldenCases(*content, file, std::cout);
-        std::cout << file << ": " << result.cases - result.failures << " of " << result.cases
-                  << " cases passed\n";
-        passed = passed && result.failures == 0;
     }
     return passed ? exitClean : exitError;
 }
@@ -166,20 +221,12 @@ int run(const Options& options) {
     if (options.statements) {
         clean = evaluator.run(*options.statements, options.keepGoing);
     } else if (!options.files.empty()) {
-        const std::optional<std::string> content = readFile(options.files.front());
-        if (!content) {
-            std::cerr << "bitcalc: can't read " << options.files.front() << "\n";
-            return exitError;
-        }
-        clean = evaluator.run(*content, options.keepGoing);
+        clean = evaluator.run(readFile(options.files.front()), options.keepGoing);
     } else if (isatty(STDIN_FILENO)) {
         clean = runInteractively(evaluator, options.keepGoing);
     } else {
-        std::ostringstream content;
-        content << std::cin.rdbuf();
-        clean = evaluator.run(content.str(), options.keepGoing);
+        clean = evaluator.run(readAll(STDIN_FILENO, "standard input"), options.keepGoing);
     }
-    std::cout.flush();
     return clean ? exitClean : exitError;
 }
 
@@ -191,11 +238,11 @@ int main(int argc, char** argv) {
         const std::string_view argument = argv[i];
         if (argument == "-h" || argument == "--help") {
             std::cout << helpText;
-            return exitClean;
+            return finishOutput(exitClean);
         } else if (argument == "--version") {
             std::cout << "bitcalc " << BITFCNS_VERSION_STRING << " (libbitfcns " << bitfcnsVersion()
                       << ")\n";
-            return exitClean;
+            return finishOutput(exitClean);
         } else if (argument == "-k" || argument == "--keep-going") {
             options.keepGoing = true;
         } else if (argument == "--canonical") {
@@ -215,13 +262,13 @@ int main(int argc, char** argv) {
     if (options.check) {
         if (options.files.empty()) return usageError("--check needs at least one file");
         if (options.statements) return usageError("--check takes files, not -e");
-        return checkFiles(options.files);
+        return finishOutput(checkFiles(options.files));
     }
     if (options.statements && !options.files.empty())
         return usageError("give either -e or a file, not both");
     if (options.files.size() > 1) return usageError("give one file to evaluate");
     try {
-        return run(options);
+        return finishOutput(run(options));
     } catch (const std::exception& error) {
         std::cerr << "bitcalc: " << error.what() << "\n";
         return exitError;

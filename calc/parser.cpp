@@ -32,9 +32,7 @@ int heightBelow(const CallExpr& node) {
 }
 int heightBelow(const ArrayLiteral& node) {
     int most = 0;
-    for (const auto& row : node.rows) {
-        for (const ExprPtr& element : row) most = std::max(most, height(element));
-    }
+    for (const ExprPtr& element : node.trees) most = std::max(most, height(element));
     return most;
 }
 
@@ -57,7 +55,10 @@ Parser::NestingGuard::NestingGuard(Parser& owner, const Token& at) : parser(owne
 Parser::NestingGuard::~NestingGuard() { --parser.nesting_; }
 
 const Token& Parser::peek(std::size_t ahead) {
-    while (lookahead_.size() <= ahead) lookahead_.push_back(lexer_.next());
+    while (lookahead_.size() <= ahead) {
+        lookahead_.push_back(lexer_.next());
+        ++tokensRead_;
+    }
     return lookahead_[ahead];
 }
 
@@ -65,6 +66,7 @@ Token Parser::take() {
     peek();
     Token token = std::move(lookahead_.front());
     lookahead_.pop_front();
+    lastTaken_ = token.pos;
     return token;
 }
 
@@ -96,13 +98,19 @@ std::optional<ParsedItem> Parser::next() {
         if (!statement) return std::nullopt;
         return ParsedItem(std::move(*statement));
     } catch (const SyntaxError& error) {
+        // Parsing goes on after the line of the error, or of the last token
+        // taken when that lies further on (an error found once a bracket
+        // spanning lines has closed), so that no line is parsed twice.
+        const SourcePos& resume = error.pos.offset < lastTaken_.offset ? lastTaken_ : error.pos;
         lookahead_.clear();
         nesting_ = 0;
-        lexer_.restartAfterLine(error.pos);
+        lexer_.restartAfterLine(resume);
         return ParsedItem(error);
     }
 }
 
+// A reference from peek() is good until the next take(): none is held across
+// a call that may take tokens.
 std::optional<Statement> Parser::parseStatement() {
     while (at(TokenKind::Newline) || at(TokenKind::Semicolon) || at(TokenKind::Comma)) take();
     if (at(TokenKind::End)) return std::nullopt;
@@ -114,57 +122,49 @@ std::optional<Statement> Parser::parseStatement() {
         statement.targets.push_back(take().text);
         take();
         statement.value = parseExpression();
-    } else if (at(TokenKind::LeftBracket) && startsMultipleAssignment()) {
-        statement.kind = Statement::Kind::MultipleAssignment;
-        take();
-        while (!at(TokenKind::RightBracket)) {
-            statement.targets.push_back(expect(TokenKind::Identifier, "a variable name").text);
-            if (at(TokenKind::Comma)) {
-                take();
-            } else if (!at(TokenKind::RightBracket)) {
-                fail(peek(), "',' or ']' in the list of outputs");
-            }
-        }
-        take();
-        if (statement.targets.empty()) fail(peek(), "a variable name in the list of outputs");
-        expect(TokenKind::Assign, "'='");
-        const Token& call = peek();
-        const bool isCall = call.kind == TokenKind::Identifier &&
-                            (endsStatement(peek(1).kind) || peek(1).kind == TokenKind::LeftParen);
-        if (!isCall) fail(call, "a function call on the right of a multiple assignment");
-        statement.value = parsePostfix();
-        if (!std::holds_alternative<CallExpr>(statement.value->node) &&
-            !std::holds_alternative<NameRef>(statement.value->node)) {
-            fail(call, "a function call on the right of a multiple assignment");
-        }
     } else {
+        const bool opensWithBracket = at(TokenKind::LeftBracket);
         statement.value = parseExpression();
+        // "[a, b] = f(x)" is read as an array up to the '=', then as the
+        // list of outputs it is: no lookahead over the brackets.
+        const auto* literal = std::get_if<ArrayLiteral>(&statement.value->node);
+        if (opensWithBracket && literal && !literal->cell && at(TokenKind::Assign))
+            parseMultipleAssignment(statement);
     }
 
-    const Token& end = peek();
-    if (!endsStatement(end.kind)) fail(end, "an operator or the end of the statement");
-    statement.displayed = end.kind != TokenKind::Semicolon;
-    if (end.kind != TokenKind::End) take();
+    const TokenKind endKind = peek().kind;
+    if (!endsStatement(endKind)) fail(peek(), "an operator or the end of the statement");
+    statement.displayed = endKind != TokenKind::Semicolon;
+    if (endKind != TokenKind::End) take();
     return statement;
 }
 
-// "[a, b] = f(x)" rather than an array: the bracket closes and '=' follows.
-bool Parser::startsMultipleAssignment() {
-    int depth = 0;
-    for (std::size_t i = 0;; ++i) {
-        switch (peek(i).kind) {
-            case TokenKind::LeftBracket:
-            case TokenKind::LeftParen:
-            case TokenKind::LeftBrace: ++depth; break;
-            case TokenKind::RightBracket:
-            case TokenKind::RightParen:
-            case TokenKind::RightBrace:
-                if (--depth == 0) return peek(i + 1).kind == TokenKind::Assign;
-                break;
-            case TokenKind::Newline:
-            case TokenKind::End: return false;
-            default: break;
-        }
+// Turns the array literal in `statement` into the list of outputs, then
+// parses the '=' and the call after it.
+void Parser::parseMultipleAssignment(Statement& statement) {
+    const auto& outputs = std::get<ArrayLiteral>(statement.value->node);
+    const bool namesOnly =
+        outputs.rowLengths.size() == 1 && outputs.numbers.empty() &&
+        std::all_of(outputs.trees.begin(), outputs.trees.end(), [](const ExprPtr& element) {
+            return std::holds_alternative<NameRef>(element->node);
+        });
+    if (!namesOnly) {
+        throw SyntaxError{statement.pos,
+                          "expected variable names in one row, such as [a, b], before '='", false};
+    }
+    statement.kind = Statement::Kind::MultipleAssignment;
+    for (const ExprPtr& element : outputs.trees)
+        statement.targets.push_back(std::get<NameRef>(element->node).name);
+    take();
+
+    const Token call = peek();  // a copy: parsePostfix takes it
+    const bool isCall = call.kind == TokenKind::Identifier &&
+                        (endsStatement(peek(1).kind) || peek(1).kind == TokenKind::LeftParen);
+    if (!isCall) fail(call, "a function call on the right of a multiple assignment");
+    statement.value = parsePostfix();
+    if (!std::holds_alternative<CallExpr>(statement.value->node) &&
+        !std::holds_alternative<NameRef>(statement.value->node)) {
+        fail(call, "a function call on the right of a multiple assignment");
     }
 }
 
@@ -255,8 +255,7 @@ ExprPtr Parser::parsePostfix() {
 }
 
 ExprPtr Parser::parsePrimary() {
-    const Token& token = peek();
-    switch (token.kind) {
+    switch (peek().kind) {
         case TokenKind::Number: {
             const Token number = take();
             return makeExpr(number.pos, NumberLiteral{number.number});
@@ -286,7 +285,7 @@ ExprPtr Parser::parsePrimary() {
             const Token open = take();
             return parseArrayLiteral(open);
         }
-        default: fail(token, "a value");
+        default: fail(peek(), "a value");
     }
 }
 
@@ -295,8 +294,13 @@ ExprPtr Parser::parseArrayLiteral(const Token& opening) {
     const bool cell = opening.kind == TokenKind::LeftBrace;
     const TokenKind closer = cell ? TokenKind::RightBrace : TokenKind::RightBracket;
     const std::string_view expectedAfterElement = cell ? "',', ';' or '}'" : "',', ';' or ']'";
-    ArrayLiteral literal{cell, {}};
-    std::vector<ExprPtr> row;
+    ArrayLiteral literal;
+    literal.cell = cell;
+    std::size_t rowLength = 0;
+    auto endRow = [&] {
+        if (rowLength != 0) literal.rowLengths.push_back(rowLength);
+        rowLength = 0;
+    };
     for (;;) {
         const TokenKind kind = peek().kind;
         if (kind == closer) {
@@ -307,17 +311,18 @@ ExprPtr Parser::parseArrayLiteral(const Token& opening) {
             take();
         } else if (kind == TokenKind::Semicolon) {
             take();
-            if (!row.empty()) literal.rows.push_back(std::move(row));
-            row.clear();
+            endRow();
         } else {
-            row.push_back(parseExpression());
+            literal.append(parseExpression());
+            ++rowLength;
             const TokenKind after = peek().kind;
             if (after != closer && after != TokenKind::Comma && after != TokenKind::Semicolon) {
                 fail(peek(), expectedAfterElement);
             }
         }
     }
-    if (!row.empty()) literal.rows.push_back(std::move(row));
+    endRow();
+    literal.numbers.shrink_to_fit();
     return makeExpr(opening.pos, std::move(literal));
 }
 

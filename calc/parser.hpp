@@ -30,6 +30,10 @@ public:
     // the end of the input. After an error parsing goes on with the next line.
     std::optional<ParsedItem> next();
 
+    // Tokens read from the lexer so far, those read again after an error
+    // included; linear in the input whatever it holds.
+    std::size_t tokensRead() const { return tokensRead_; }
+
 private:
     const Token& peek(std::size_t ahead = 0);
     Token take();
@@ -38,7 +42,7 @@ private:
     [[noreturn]] void fail(const Token& found, std::string_view expected);
 
     std::optional<Statement> parseStatement();
-    bool startsMultipleAssignment();
+    void parseMultipleAssignment(Statement& statement);
     ExprPtr parseExpression();
     ExprPtr parseAdditive();
     ExprPtr parseMultiplicative();
@@ -63,6 +67,8 @@ private:
 
     Lexer lexer_;
     std::deque<Token> lookahead_;
+    SourcePos lastTaken_;  // of the last token taken, where recovery starts at the latest
+    std::size_t tokensRead_ = 0;
     int nesting_ = 0;
 };
 

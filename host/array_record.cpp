@@ -95,6 +95,8 @@ DimsView trueDimensions(const zqArray_tag& array) {
 }
 
 unsigned long trueElementCount(const zqArray_tag& array) {
+    // Wrapping can't change the product: with a 0 among the sizes it is 0
+    // modulo 2^64 too, and without one the record couldn't have been made.
     const DimsView dims = trueDimensions(array);
     unsigned long count = 1;
     for (unsigned long i = 0; i < dims.count; ++i) count *= dims[i];
@@ -125,8 +127,13 @@ void completeDimensions(const zqArray_tag& constArray) {
 
 zqArray_tag* newArray(zqClassID cls, DimsView dims, bool complex) noexcept {
     const std::size_t elementBytes = elementSizeIn(StoredElements{}, cls);
+    // A size of 0 makes an empty array whatever the other sizes: only a
+    // product of sizes none of which is 0 can overflow.
     unsigned long count = 1, bytes = 0;
     for (unsigned long i = 0; i < dims.count; ++i) {
+        if (dims[i] == 0) count = 0;
+    }
+    for (unsigned long i = 0; i < dims.count && count != 0; ++i) {
         if (!multiplyChecked(count, dims[i], count)) return nullptr;
     }
     if (!multiplyChecked(count, elementBytes, bytes)) return nullptr;

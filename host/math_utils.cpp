@@ -88,6 +88,8 @@ bool planExpansion(DimsView first, DimsView second, Expansion& plan) {
         if (a != b && a != 1 && b != 1) return false;
         const unsigned long size = a == 1 ? b : a;
         plan.resultDims[i] = size;
+        // Modulo 2^64: right with a 0 among the sizes; without one, an
+        // overflowing result is refused when it is made.
         plan.elementCount *= size;
         if (size != 1) {
             const MergedDims dims{size, a == 1 ? 0 : strideFirst, b == 1 ? 0 : strideSecond};

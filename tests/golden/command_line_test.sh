@@ -36,6 +36,19 @@ expect "file" 0 'y = double 1x1 [6]' -- "$bitcalc" --canonical "$scratch/stateme
 expect "standard input" 0 'y = double 1x1 [6]' -- bash -c "'$bitcalc' --canonical < '$scratch/statements.m'"
 expect "missing file" 1 '' -- "$bitcalc" "$scratch/none.m"
 
+# Lost output and input that can't be read are errors, told on standard error.
+stderr_says() {
+  grep -q -- "$1" "$scratch/stderr" || { echo "FAIL stderr lacks '$1'"; failures=$((failures + 1)); }
+}
+expect "write error" 1 '' -- bash -c "'$bitcalc' --canonical -e 'x = 1:10' >/dev/full"
+stderr_says "can't write the output"
+expect "directory" 1 '' -- "$bitcalc" "$scratch"
+stderr_says "Is a directory"
+expect "--check directory" 1 '' -- "$bitcalc" --check "$scratch"
+printf '%% no cases\n' >"$scratch/empty.case"
+expect "--check without cases" 1 '' -- "$bitcalc" --check "$scratch/empty.case"
+stderr_says "holds no cases"
+
 printf '>> 1 + 1\nans = double 1x1 [2]\n\n>> x = 5\nx = double 1x1 [6]\n' >"$scratch/failing.case"
 expect "--check reports the line" 1 \
   "$scratch/failing.case:4: >> x = 5

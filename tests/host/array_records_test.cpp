@@ -63,6 +63,12 @@ TEST_F(ArrayRecordTest, CreationRefusesWhatItCannotMake) {
     EXPECT_FALSE(create_uninitnumeric(2, nullptr, zqDoubleClass, zqReal, 0, nullptr));
 }
 
+TEST_F(ArrayRecordTest, ASizeOfZeroMakesNoElementsWhateverTheOtherSizes) {
+    zqArraySlot array = create({1UL << 62, 1UL << 62, 0});
+    ASSERT_TRUE(array);
+    EXPECT_EQ(elementCount(*array), 0u);
+}
+
 TEST_F(ArrayRecordTest, ComplexCreationHasAnImaginaryPart) {
     const unsigned long dims[] = {3, 2};
     zqArraySlot array(create_uninitnumeric(2, dims, zqSingleClass, zqComplex, 0, nullptr));
