@@ -8,8 +8,8 @@
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
+#include "frame/math_routines.hpp"
 #include "frame/message_tags.hpp"
-#include "host/math_utils.hpp"
 
 namespace bitfcns {
 namespace {

@@ -23,6 +23,8 @@ template <class... Handlers>
 struct Overloaded : Handlers... {
     using Handlers::operator()...;
 };
+template <class... Handlers>
+Overloaded(Handlers...) -> Overloaded<Handlers...>;
 
 // The arguments of a library call, evaluated. An argument that is an array
 // just made (a call's result, a conversion, a literal) is flagged for the

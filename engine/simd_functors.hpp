@@ -110,10 +110,13 @@ private:
     std::uint32_t bitIndex_;
 };
 // a with bit `bitIndex` set if v is not zero (in W's own type), cleared if it
-// is. W is T in the vector pair; bitset also uses it with other value types.
+// is. W is T in the vector pair; bitset also uses it with other value types,
+// and for 64-bit T, in the plain two-input operator with this limit.
 template <class T, class W>
 class IntBitsetFtor {
 public:
+    static constexpr unsigned long parallelLimit = limits::bitsetScalarPosition;
+
     explicit IntBitsetFtor(std::uint32_t bitIndex) noexcept : bitIndex_(bitIndex) {
         assert(belowWidth<T>(bitIndex));
     }

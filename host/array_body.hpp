@@ -76,6 +76,14 @@ DimsView normaliseDims(unsigned long given, const unsigned long* sizes);
 // elements get no storage.
 zqArray_tag* newArray(zqClassID cls, DimsView dims, bool complex) noexcept;
 
+// A new record of class `cls` (numeric or logical) with the sizes `dims`
+// (normalised) reading the elements at `data`, which stay their owner's: a
+// lent block stands for them and calls `returnLent(owner)` when the last
+// record reading them is gone. Null when memory can't be had; `returnLent`
+// has not run then.
+zqArray_tag* newArrayOverLent(zqClassID cls, DimsView dims, void* data,
+                              void (*returnLent)(void*) noexcept, void* owner) noexcept;
+
 // A new record with the class, flags and sizes of `source` that shares its
 // storage and elements; null when memory can't be had.
 zqArray_tag* newSharingRecord(const zqArray_tag& source) noexcept;

@@ -54,6 +54,19 @@ zqArraySlot makeArray(zqClassID cls, const Dims& dims, std::span<const std::byte
     return array;
 }
 
+zqArraySlot makeArrayOverLentElements(zqClassID cls, std::span<const unsigned long> dims,
+                                      LentElements elements) {
+    if (cls != zqLogicalClass && !isNumericClass(cls)) {
+        elements.returnLent(elements.owner);
+        throw std::invalid_argument(
+            "host::makeArrayOverLentElements: not a numeric or logical class");
+    }
+    zqArray_tag* array = newArrayOverLent(cls, normaliseDims(dims.size(), dims.data()),
+                                          elements.data, elements.returnLent, elements.owner);
+    if (!array) elements.returnLent(elements.owner);
+    return checkedArray(array);
+}
+
 zqArraySlot makeDoubleScalar(double value) {
     return makeArray(zqDoubleClass, {1, 1}, std::span<const double>(&value, 1));
 }

@@ -37,6 +37,22 @@ zqArraySlot makeArray(zqClassID cls, const Dims& dims, std::span<const T> values
     return makeArray(cls, dims, std::as_bytes(values));
 }
 
+// Elements that stay another owner's, lent to arrays that read them in
+// place: column-major, of the host's element type for the class, aligned to
+// the element size. `returnLent(owner)` runs exactly once, when the last
+// array reading them (shared copies included) is gone, on whichever thread
+// drops it; it must not raise.
+struct LentElements {
+    void* data;
+    void* owner;
+    void (*returnLent)(void* owner) noexcept;
+};
+
+// A numeric or logical array over lent elements, with no copy. When it
+// can't be made, the elements are given back before the error is raised.
+zqArraySlot makeArrayOverLentElements(zqClassID cls, std::span<const unsigned long> dims,
+                                      LentElements elements);
+
 zqArraySlot makeDoubleScalar(double value);
 zqArraySlot makeLogicalScalar(bool value);
 

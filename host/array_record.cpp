@@ -169,6 +169,28 @@ zqArray_tag* newArray(zqClassID cls, DimsView dims, bool complex) noexcept {
     return array;
 }
 
+zqArray_tag* newArrayOverLent(zqClassID cls, DimsView dims, void* data,
+                              void (*returnLent)(void*) noexcept, void* owner) noexcept {
+    if (!allocationPermitted()) return nullptr;
+    // Record and lent block share one chunk, which the block frees last.
+    const std::size_t chunkBytes = kRecordBytes + sizeof(StorageBlock);
+    void* chunk = allocateChunk(chunkBytes);
+    if (!chunk) return nullptr;
+    zqArray_tag* array = placeRecord(chunk);
+    array->classId = cls;
+    array->flags = isNumericClass(cls) ? zqNumericFlag : 0;
+    array->data = data;
+    if (!storeDimensions(*array, dims, false)) {
+        // No lent block yet: the record owns the chunk.
+        array->body->recordChunk = chunk;
+        destroyRecord(array);
+        return nullptr;
+    }
+    array->body->real = placeLentStorageInChunk(static_cast<std::byte*>(chunk) + kRecordBytes,
+                                                chunk, chunkBytes, returnLent, owner);
+    return array;
+}
+
 zqArray_tag* newSharingRecord(const zqArray_tag& source) noexcept {
     completeDimensions(source);
     if (!allocationPermitted()) return nullptr;

@@ -5,6 +5,7 @@
 #include "host/element_conversion.hpp"
 #include "host/element_types.hpp"
 #include "host/exceptions.hpp"
+#include "host/parallel_limits.hpp"
 
 #include <emmintrin.h>
 #include <tbb/blocked_range.h>
@@ -19,11 +20,6 @@ namespace host {
 
 namespace {
 
-// From this many elements a conversion is split over TBB workers. A
-// conversion takes about a nanosecond per element, so 64 Ki elements take
-// some 50 us alone; starting a parallel_for on two workers costs a few
-// microseconds, well below that.
-constexpr std::size_t kParallelConversionElements = std::size_t{1} << 16;
 constexpr std::size_t kConversionGrain = std::size_t{1} << 14;
 
 // Doubles to an integer class, two at a time where both are whole numbers in
@@ -82,7 +78,7 @@ void convertRun(const From* in, To* out, std::size_t begin, std::size_t end) {
 
 template <class To, class From>
 void convertElements(const From* in, To* out, std::size_t count) {
-    if (count < kParallelConversionElements) {
+    if (count < parallelConversionElements) {
         convertRun(in, out, 0, count);
         return;
     }

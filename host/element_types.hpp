@@ -54,7 +54,8 @@ namespace detail {
 template <class T, class... Tags>
 constexpr zqClassID classOfElementIn(TagList<Tags...>) {
     zqClassID id = zqNoClass;
-    ((std::is_same_v<T, typename Tags::type> ? (id = Tags::id, true) : false) || ...);
+    static_cast<void>(
+        ((std::is_same_v<T, typename Tags::type> ? (id = Tags::id, true) : false) || ...));
     return id;
 }
 }  // namespace detail
@@ -76,7 +77,8 @@ decltype(auto) visitElementClassIn(TagList<Tags...>, zqClassID id, Visitor& visi
         if (!found) otherwise();
     } else {
         std::optional<Result> result;
-        ((id == Tags::id ? (result.emplace(visitor(Tags{})), true) : false) || ...);
+        static_cast<void>(
+            ((id == Tags::id ? (result.emplace(visitor(Tags{})), true) : false) || ...));
         return result ? Result(std::move(*result)) : otherwise();
     }
 }
@@ -94,7 +96,8 @@ decltype(auto) visitElementClass(zqClassID id, Visitor&& visitor, Otherwise&& ot
 template <class... Tags>
 constexpr std::size_t elementSizeIn(TagList<Tags...>, zqClassID id) {
     std::size_t size = 0;
-    ((id == Tags::id ? (size = sizeof(typename Tags::type), true) : false) || ...);
+    static_cast<void>(
+        ((id == Tags::id ? (size = sizeof(typename Tags::type), true) : false) || ...));
     return size;
 }
 

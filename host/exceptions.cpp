@@ -7,6 +7,7 @@
 #include "host/message_catalogue.hpp"
 #include "host/zq_array.hpp"
 
+#include <atomic>
 #include <utility>
 
 namespace resource_core {
@@ -105,10 +106,14 @@ private:
     std::string id_;
 };
 
+// Errors may be raised on several threads at once (a host that calls
+// libraries without a global lock); the switch and the count are atomic. The
+// last identifier is only kept while the legacy call comes back, a setting
+// for single-threaded tests.
 struct LegacyErrorState {
-    bool raises = true;
+    std::atomic<bool> raises{true};
     std::string lastId;
-    std::size_t count = 0;
+    std::atomic<std::size_t> count{0};
 };
 
 LegacyErrorState& legacyState() {

@@ -5,6 +5,7 @@
 #include "host/bitwise_kernels.hpp"
 #include "host/element_types.hpp"
 #include "host/math_utils.hpp"
+#include "host/parallel_limits.hpp"
 
 #include <tbb/blocked_range.h>
 #include <tbb/parallel_for.h>
@@ -15,9 +16,6 @@
 namespace host {
 namespace {
 
-// From this many bytes the complement is split over TBB workers; one pass reads
-// and writes each byte once, so the same reasoning as for AND holds.
-constexpr std::size_t kParallelComplementBytes = std::size_t{256} << 10;
 constexpr std::size_t kComplementGrainBytes = std::size_t{64} << 10;
 
 void complementSerial(std::byte* out, const std::byte* in, std::size_t count) {
@@ -26,7 +24,7 @@ void complementSerial(std::byte* out, const std::byte* in, std::size_t count) {
 
 // Complements `count` contiguous bytes; `out` may equal `in`.
 void complementBytes(std::byte* out, const std::byte* in, std::size_t count) {
-    if (count < kParallelComplementBytes) {
+    if (count < parallelResultBytes) {
         complementSerial(out, in, count);
         return;
     }

@@ -10,6 +10,7 @@
 #include "host/element_conversion.hpp"
 #include "host/element_types.hpp"
 #include "host/exceptions.hpp"
+#include "host/parallel_limits.hpp"
 
 #include <tbb/blocked_range.h>
 #include <tbb/parallel_for.h>
@@ -22,11 +23,6 @@ namespace host {
 
 namespace {
 
-// From this many bytes of result the combining is split over TBB workers. One
-// pass reads two bytes and writes one per result byte, some 30 us for 256 KiB
-// at memory speed, against a few microseconds to start a parallel_for on two
-// workers.
-constexpr std::size_t kParallelResultBytes = std::size_t{256} << 10;
 constexpr std::size_t kGrainBytes = std::size_t{64} << 10;
 
 [[noreturn]] void badOperands() { raiseHostError("VESPRA:bsxfun", "badOperands"); }
@@ -163,7 +159,7 @@ void combineRange(const CombineJob& job, unsigned long begin, unsigned long end)
 template <class Op>
 void combine(const CombineJob& job) {
     const unsigned long count = job.plan->elementCount;
-    if (count * job.elementBytes < kParallelResultBytes) {
+    if (count * job.elementBytes < parallelResultBytes) {
         combineRange<Op>(job, 0, count);
         return;
     }

@@ -261,6 +261,14 @@ StorageBlock* placeStorageInChunk(void* where, std::size_t capacity, void* chunk
     return block;
 }
 
+StorageBlock* placeLentStorageInChunk(void* where, void* chunk, std::size_t chunkBytes,
+                                      void (*returnLent)(void*) noexcept, void* owner) noexcept {
+    StorageBlock* block = placeStorageInChunk(where, 0, chunk, chunkBytes);
+    block->returnLent = returnLent;
+    block->lentOwner = owner;
+    return block;
+}
+
 StorageBlock* allocateStorage(std::size_t bytes) noexcept {
     if (!allocationPermitted()) return nullptr;
     if (bytes >= kLargeBlockBytes) return acquireLargeBlock(bytes);
@@ -284,6 +292,7 @@ void releaseStorage(StorageBlock* block) noexcept {
         ASAN_POISON_MEMORY_REGION(block->data(), block->capacity);
         largeBlocks().give(block);
     } else {
+        if (block->returnLent) block->returnLent(block->lentOwner);
         void* chunk = block->allocation;
         const std::size_t chunkBytes = block->allocationBytes;
         block->~StorageBlock();

@@ -1,7 +1,8 @@
 // Element storage of host arrays: reference-counted blocks that several
 // records may share, the allocator behind them (small chunks from the heap,
-// large blocks mapped with transparent huge pages and kept for reuse), and the
-// allocation failures that tests ask for. Private to the host.
+// large blocks mapped with transparent huge pages and kept for reuse), blocks
+// over elements lent by another owner, and the allocation failures that tests
+// ask for. Private to the host.
 #pragma once
 
 #include <atomic>
@@ -11,13 +12,17 @@ namespace host {
 
 // A block of element storage, shared by every record that reads its
 // elements from it. The elements follow the header, 16-byte aligned (64 for
-// large blocks).
+// large blocks), except in a lent block: there they are another owner's, and
+// the records read them through their own data pointers.
 struct alignas(16) StorageBlock {
     std::atomic<std::size_t> references{1};
     std::size_t capacity = 0;         // usable bytes at data()
     void* allocation = nullptr;       // the heap chunk or mapping holding the block
     std::size_t allocationBytes = 0;  // its size
     bool mapped = false;              // from the large-block allocator
+    // A lent block: given back by `returnLent(lentOwner)` with the last reference.
+    void (*returnLent)(void* owner) noexcept = nullptr;
+    void* lentOwner = nullptr;
 
     std::byte* data() { return reinterpret_cast<std::byte*>(this + 1); }
 };
@@ -44,6 +49,11 @@ StorageBlock* allocateStorage(std::size_t bytes) noexcept;
 // `chunk`; the block's memory is the chunk's.
 StorageBlock* placeStorageInChunk(void* where, std::size_t capacity, void* chunk,
                                   std::size_t chunkBytes) noexcept;
+
+// Makes the block at `where` inside a heap chunk a lent block: it holds no
+// elements, and its last release calls `returnLent(owner)` and frees the chunk.
+StorageBlock* placeLentStorageInChunk(void* where, void* chunk, std::size_t chunkBytes,
+                                      void (*returnLent)(void*) noexcept, void* owner) noexcept;
 
 void retainStorage(StorageBlock* block) noexcept;
 // Drops one reference; the last one gives the memory back (to the

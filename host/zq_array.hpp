@@ -48,14 +48,17 @@ inline constexpr std::uint32_t zqTwoDimensionalFlag = 0x40000;
 // The array record. The first members are read by libraries directly, in
 // this order; everything from `body` on is the host's own.
 struct zqArray_tag {
+    // Sizes of any count, held behind a pointer.
+    struct SizeList {
+        unsigned long* dims;  // the sizes
+        unsigned long ndims;  // and their count
+    };
+
     zqClassID classId;
     std::uint32_t flags;
     union {
         unsigned long sizes2[2];  // with zqTwoDimensionalFlag: rows, columns
-        struct {
-            unsigned long* dims;  // otherwise: the sizes
-            unsigned long ndims;  // and their count
-        } sizesN;
+        SizeList sizesN;          // otherwise
     };
     void* data;  // the real elements
 

@@ -6,8 +6,8 @@
 #include "frame/assumed_type.hpp"
 #include "frame/exception.hpp"
 #include "frame/floating.hpp"
+#include "frame/math_routines.hpp"
 #include "frame/message_tags.hpp"
-#include "host/math_utils.hpp"
 
 #include <boost/intrusive_ptr.hpp>
 

@@ -1,10 +1,12 @@
 #!/usr/bin/env bash
-# Builds the optimised and the sanitizer configurations and runs the whole
-# test suite in both.
+# Checks the direction of includes, builds the optimised, the sanitizer and
+# the clang configurations, checks the library's exports and runs the whole
+# test suite in all three.
 set -euo pipefail
 cd "$(dirname "$0")/.."
-scripts/bootstrap.sh release sanitize
+scripts/check_includes.sh
+scripts/bootstrap.sh release sanitize clang
 scripts/check_exports.sh build/release/libbitfcns.so
-for preset in release sanitize; do
+for preset in release sanitize clang; do
   ctest --preset "$preset" -j "$(nproc)"
 done

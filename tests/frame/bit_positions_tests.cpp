@@ -1,11 +1,15 @@
 // Bit positions in every class: 0, 1, the width, one past it, negatives,
-// values wider than the indexed class, and the odd floating values.
+// values wider than the indexed class, and the odd floating values; and the
+// scan of whole arrays of them.
 #include "frame/bit_positions.hpp"
+#include "frame/position_scan.hpp"
 
 #include <gtest/gtest.h>
 
 #include <cstdint>
 #include <limits>
+#include <type_traits>
+#include <vector>
 
 namespace {
 
@@ -47,3 +51,29 @@ TEST(BitPositions, FloatingClassesMustBeWholeAndFinite) {
 }
 
 }  // namespace
+
+// The block scan agrees with bitIsValid wherever the one bad position lies:
+// in a register's body, its tail, or either side of a block boundary.
+template <class U>
+class PositionScan : public ::testing::Test {};
+using PositionTypes = ::testing::Types<double, float, signed char, unsigned short, long>;
+TYPED_TEST_SUITE(PositionScan, PositionTypes);
+
+TYPED_TEST(PositionScan, FindsTheOneInvalidPositionAnywhere) {
+    using U = TypeParam;
+    constexpr unsigned long n = 2051;
+    std::vector<U> positions(n);
+    for (unsigned long i = 0; i < n; ++i) positions[i] = static_cast<U>(i % 16 + 1);
+    EXPECT_TRUE(bitfcns::allPositionsValid(positions.data(), n, 16));
+    EXPECT_FALSE(bitfcns::allPositionsValid(positions.data(), n, 15));
+    std::vector<U> bad{0, 17, static_cast<U>(-1)};
+    if constexpr (std::is_floating_point_v<U>)
+        bad.insert(bad.end(), {U(1.5), std::numeric_limits<U>::quiet_NaN(),
+                               std::numeric_limits<U>::infinity()});
+    for (unsigned long at : {0ul, 1ul, 3ul, 1023ul, 1024ul, 2047ul, 2048ul, n - 1})
+        for (U b : bad) {
+            std::vector<U> withBad = positions;
+            withBad[at] = b;
+            EXPECT_FALSE(bitfcns::allPositionsValid(withBad.data(), n, 16)) << at << " " << +b;
+        }
+}

@@ -1,5 +1,6 @@
-// Terse makers and readers of host arrays for tests, and a caller of the
-// exported entry points that reports the identifier of a refusal.
+// Terse makers and readers of host arrays for tests, a fixture that fails a
+// test which leaves array records alive, and a caller of the exported entry
+// points that reports the identifier of a refusal.
 #pragma once
 
 #include "host/array_factory.hpp"
@@ -7,7 +8,8 @@
 #include "host/exceptions.hpp"
 #include "host/zq_array.hpp"
 
-#include <cstring>
+#include <gtest/gtest.h>
+
 #include <exception>
 #include <initializer_list>
 #include <span>
@@ -15,6 +17,9 @@
 #include <vector>
 
 namespace testing_support {
+
+using IntegerTypes = ::testing::Types<signed char, unsigned char, short, unsigned short, int,
+                                      unsigned int, long, unsigned long>;
 
 // The host class of an element type.
 template <class T>
@@ -45,10 +50,19 @@ zqArraySlot scalarOf(T value) {
 // The real elements of `array`, read as T.
 template <class T>
 std::vector<T> elementsOf(const zqArray_tag* array) {
-    std::vector<T> values(host::elementCount(*array));
-    if (!values.empty()) std::memcpy(values.data(), array->data, values.size() * sizeof(T));
-    return values;
+    const T* data = static_cast<const T*>(array->data);
+    return std::vector<T>(data, data + host::elementCount(*array));
 }
+
+class LeakCheckedTest : public ::testing::Test {
+protected:
+    void TearDown() override {
+        EXPECT_EQ(host::liveArrayCount(), liveAtStart_) << "array records leaked";
+    }
+
+private:
+    std::size_t liveAtStart_ = host::liveArrayCount();
+};
 
 using EntryPoint = void (*)(int, zqArraySlot*, int, const zqArray_tag**);
 

@@ -1,0 +1,59 @@
+// The element functions of bitget: BitgetFtor<T> for double values taken for
+// integers of class T, and bitgetVVFtor<T, U> for integer values of class T
+// with an array of positions of class U. A position p names bit p - 1, the
+// least significant bit being position 1.
+#pragma once
+
+#include "engine/parallel_limits.hpp"
+#include "engine/simd_functors.hpp"
+#include "frame/integer_conversion.hpp"
+
+#include <cstdint>
+#include <type_traits>
+
+namespace bitfcns {
+
+// Masks a bit index to the width that T is shifted in (32 bits, or 64 for
+// 64-bit T): a validated index passes unchanged, and no shift can ever reach
+// the width.
+template <class T>
+constexpr unsigned shiftableIndex(std::uint64_t index) noexcept {
+    return static_cast<unsigned>(index & (sizeof(Widened<T>) * 8 - 1));
+}
+
+// Bit `index` of v, read as 0 or 1 of T. Signed T shifts arithmetically, which
+// reads the bits of v's two's complement within its width.
+template <class T>
+T bitOf(T v, std::uint64_t index) noexcept {
+    return static_cast<T>((static_cast<Widened<T>>(v) >> shiftableIndex<T>(index)) & 1);
+}
+
+// x and p are whole numbers, x held by T and p from 1 to T's width (both
+// tested before): bit p - 1 of x taken as a T, given back as 0.0 or 1.0.
+template <class T>
+struct BitgetFtor {
+    static constexpr unsigned long parallelLimit = limits::bitgetOnDouble;
+
+    double operator()(double x, double p) const noexcept {
+        const T index = wholeDoubleTo<T>(p - 1.0);
+        return static_cast<double>(bitOf(wholeDoubleTo<T>(x), static_cast<std::uint64_t>(index)));
+    }
+};
+
+// a of class T, p a position of class U from 1 to T's width (tested
+// before): bit p - 1 of a. An integer p is widened like T's elements, a
+// single or double p truncated to an integer first.
+template <class T, class U>
+struct bitgetVVFtor {
+    static constexpr unsigned long parallelLimit = limits::bitgetPositionArray;
+
+    T operator()(T a, U p) const noexcept {
+        if constexpr (std::is_floating_point_v<U>) {
+            return bitOf(a, static_cast<std::uint64_t>(static_cast<std::int32_t>(p) - 1));
+        } else {
+            return bitOf(a, static_cast<std::uint64_t>(static_cast<Widened<U>>(p) - 1));
+        }
+    }
+};
+
+}  // namespace bitfcns

@@ -1,0 +1,99 @@
+// The element arithmetic of bitset: the position and mask that one valid
+// BIT element gives, the truth of one V element, the functors of the integer
+// path (bitsetVVVFtor, bitsetVVTFtor, bitsetVVFFtor) and BitsetFtor<T>, which
+// works on doubles taken for integers of class T.
+//
+// Everything works on the stored bit pattern of T: the sign bit of a signed
+// T is an ordinary bit, and nothing saturates. BIT elements reach a functor
+// only after every one of them has passed bitIsValid, so none is tested
+// again here and no shift reaches the width of its mask.
+#pragma once
+
+#include "engine/parallel_limits.hpp"
+#include "frame/integer_conversion.hpp"
+
+#include <cstdint>
+#include <type_traits>
+
+namespace bitfcns {
+
+// The word a bit is set or cleared in: 32 bits for T of up to 32 bits, of
+// which the store keeps T's low bits, and 64 bits for 64-bit T.
+template <class T>
+using BitMask = std::conditional_t<(sizeof(T) == 8), std::uint64_t, std::uint32_t>;
+
+// The zero-based index of a valid position (1 to the width of T). An
+// integer position has no bits beyond the low ones, so 32 bits of it do; a
+// floating one is truncated to 32 bits first.
+template <class U>
+std::uint32_t bitIndexOf(U b) noexcept {
+    if constexpr (std::is_integral_v<U>) {
+        return static_cast<std::uint32_t>(b) - 1u;
+    } else {
+        return static_cast<std::uint32_t>(static_cast<std::int32_t>(b) - 1);
+    }
+}
+
+template <class T>
+BitMask<T> maskAt(std::uint32_t bitIndex) noexcept {
+    return BitMask<T>{1} << bitIndex;
+}
+
+// The bits of `word` with those of `mask` set or cleared, cut to T; without
+// a branch, since `set` may change from one element to the next.
+template <class T>
+T withMask(T word, BitMask<T> mask, bool set) noexcept {
+    const auto bits = static_cast<BitMask<T>>(word);
+    const auto setBits = static_cast<BitMask<T>>(mask & (BitMask<T>{0} - BitMask<T>{set}));
+    return static_cast<T>((bits & ~mask) | setBits);
+}
+
+// A V element is true when it isn't zero in its own type: 256 in an int16 is
+// true, a NaN is true, -0.0 is false.
+template <class W>
+bool isTrue(W v) noexcept {
+    return v != W{};
+}
+
+// a with bit b set where v is true and cleared where it is false; BIT and V
+// both arrays. The type of BIT is the call operator's own.
+template <class T, class W>
+struct bitsetVVVFtor {
+    static constexpr unsigned long parallelLimit = limits::bitsetPositionValueArrays;
+
+    template <class U>
+    T operator()(T a, U b, W v) const noexcept {
+        return withMask(a, maskAt<T>(bitIndexOf(b)), isTrue(v));
+    }
+};
+
+// a with bit b set: an array of BIT with one true V, or with none.
+template <class T, class U>
+struct bitsetVVTFtor {
+    static constexpr unsigned long parallelLimit = limits::bitsetPositionArrayTrue;
+
+    T operator()(T a, U b) const noexcept { return withMask(a, maskAt<T>(bitIndexOf(b)), true); }
+};
+
+// a with bit b cleared: an array of BIT with one false V.
+template <class T, class U>
+struct bitsetVVFFtor {
+    static constexpr unsigned long parallelLimit = limits::bitsetPositionArrayFalse;
+
+    T operator()(T a, U b) const noexcept { return withMask(a, maskAt<T>(bitIndexOf(b)), false); }
+};
+
+// A double a, taken for the integer of class T that it holds (tested
+// before), with bit b set where v is true and cleared where it is false,
+// given back as a double: exact up to 32 bits, rounded to nearest for the
+// 64-bit classes. Setting the top bit of a signed T makes the value negative.
+template <class T>
+struct BitsetFtor {
+    static constexpr unsigned long parallelLimit = limits::bitsetOnDouble;
+
+    double operator()(double a, double b, bool v) const noexcept {
+        return integerToDouble(withMask(wholeDoubleTo<T>(a), maskAt<T>(bitIndexOf(b)), v));
+    }
+};
+
+}  // namespace bitfcns

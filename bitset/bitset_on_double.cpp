@@ -1,0 +1,97 @@
+// bitset on A and BIT of class double, taken for integers of the assumed
+// class (uint64 unless the call names one): the call forms, the order of
+// refusals, the result, and the drivers that validate A and BIT and run
+// BitsetFtor<T>.
+#include "bitset/bit_checks.hpp"
+#include "bitset/bitset_functors.hpp"
+#include "bitset/bitset_paths.hpp"
+#include "bitset/result_shape.hpp"
+#include "engine/vector_ops.hpp"
+#include "frame/array.hpp"
+#include "frame/assumed_type.hpp"
+#include "frame/class_types.hpp"
+#include "frame/element_scan.hpp"
+#include "frame/exception.hpp"
+#include "frame/message_tags.hpp"
+#include "frame/scalar_text.hpp"
+
+namespace bitfcns {
+namespace {
+
+using errors = VESPRA::bitset;
+
+// Validates all of A, then all of BIT, for class T, and fills the result,
+// which exists already. A scalar operand is validated even when the result
+// is empty. Nothing is written before both have passed, so a refusal leaves
+// A untouched when the result shares its storage. V needs no test: it is
+// logical.
+template <class T>
+void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool* valueData,
+                        zqArray_tag* result, bool scalarA, bool scalarBit, bool scalarValue) {
+    const unsigned long n = numberOfElements(result);
+    const double* values = dataOf<double>(a);
+    const double* positions = dataOf<double>(bit);
+    if (!allFitInteger<T>(values, scalarA ? 1 : n)) raiseError<errors::outOfRange>();
+    checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>);
+    runVectorOp(
+        bitfcnsThreeInputVectorOp<double, double, bool, BitsetFtor<T>>{values,
+                                                                       positions,
+                                                                       valueData,
+                                                                       dataOf<double>(result),
+                                                                       strideOf(scalarA),
+                                                                       strideOf(scalarBit),
+                                                                       strideOf(scalarValue),
+                                                                       n,
+                                                                       {}});
+}
+
+}  // namespace
+
+void bitsetOnDouble(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {
+    const zqArray_tag* a = prhs[0];
+    const zqArray_tag* bit = prhs[1];
+    // The same test as the entry point's tells a third operand's role.
+    const bool withValue = nrhs == 4 || (nrhs == 3 && !isScalarText(prhs[2]));
+
+    // V as logical, or a single true value when the call has none.
+    static constexpr bool missingValue = true;
+    boost::intrusive_ptr<zqArray_tag> logicalValue;
+    const bool* valueData = &missingValue;
+    bool scalarValue = true;
+    if (withValue) {
+        const zqArray_tag* value = prhs[2];
+        if (isSparse(a) || isSparse(bit) || isSparse(value)) raiseError<errors::sparseArgs>();
+        if (classOf(value) == zqSingleClass) raiseError<errors::invalidV>();
+        if (isComplex(a) || isComplex(bit) || isComplex(value)) raiseError<errors::complexArgs>();
+        if (classOf(bit) == zqSingleClass) raiseError<VESPRA::bitSetGet::firstArgNotInt>();
+        if (classOf(value) != zqLogicalClass && !isNumeric(value)) raiseError<errors::invalidV>();
+        logicalValue = matrix::convert_if_needed(value, zqLogicalClass);
+        valueData = matrix::detail::noninlined::zq_array_api::zqGetLogicals(logicalValue.get());
+        scalarValue = isScalar(logicalValue.get());
+    } else {
+        if (isSparse(a) || isSparse(bit)) raiseError<errors::sparseArgs>();
+        if (isComplex(a) || isComplex(bit)) raiseError<errors::complexArgs>();
+    }
+    const bool scalarA = isScalar(a);
+    const bool scalarBit = isScalar(bit);
+    const zqArray_tag* shape =
+        resultShapeSource(a, scalarA, bit, scalarBit, logicalValue.get(), scalarValue);
+    if (shape == nullptr) raiseError<errors::sizeMismatch>();
+    // The type comes last of the operands when the call has one. Whether it
+    // names a class is tested only once the result exists.
+    const bool namesType = nrhs == 4 || (nrhs == 3 && !withValue);
+    const zqClassID assumed = namesType ? parseAssumedType(prhs[nrhs - 1]) : zqUInt64Class;
+
+    plhs[0] = !scalarA && wantsSharedResult(a)
+                  ? shareResult(a)
+                  : createResult(numberOfDimensions(shape), dimensionsOf(shape), zqDoubleClass);
+    visitClass<IntegerClasses>(
+        assumed,
+        [&]<class Tag>(Tag) {
+            bitsetDoubleDriver<typename Tag::type>(a, bit, valueData, plhs[0].get(), scalarA,
+                                                   scalarBit, scalarValue);
+        },
+        [] { raiseError<errors::unknownTypeString>(); });
+}
+
+}  // namespace bitfcns

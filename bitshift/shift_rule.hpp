@@ -1,0 +1,95 @@
+// The shift rule of bitshift as element functors: BitshiftFtor<T> for doubles
+// taken for integers of class T, bitshiftVVFtor<T, U> for an integer value
+// and a count of any numeric class. A positive count shifts left, a negative
+// one right; counts at or beyond the width are answered without a shift, so
+// no shift by the width or more is ever made.
+#pragma once
+
+#include "engine/parallel_limits.hpp"
+#include "engine/simd_functors.hpp"
+#include "frame/class_types.hpp"
+#include "frame/integer_conversion.hpp"
+
+#include <cmath>
+#include <cstdint>
+#include <type_traits>
+
+namespace bitfcns {
+
+// x shifted left by k (0 < k < width), the bits past the top lost; signed x
+// wraps through its sign bit. Computed on x widened to 32 bits (64-bit x as
+// it is) and read as unsigned, so no shift overflows.
+template <class T>
+T shiftLeftWithin(T x, int k) noexcept {
+    const auto bits = static_cast<WidenedBits<T>>(static_cast<Widened<T>>(x));
+    return static_cast<T>(bits << k);
+}
+
+// x shifted right by k (0 <= k < width): arithmetically for signed T,
+// logically for unsigned T.
+template <class T>
+T shiftRightWithin(T x, int k) noexcept {
+    return static_cast<T>(static_cast<Widened<T>>(x) >> k);
+}
+
+// The element of a value of width `nbits` and a count at or beyond it: a
+// right shift of a negative value ends at -1, everything else at 0. Only
+// signed values and signed counts can give -1.
+template <class T, class U>
+T shiftedOut(T x, U c) noexcept {
+    if constexpr (std::is_signed_v<T> && std::is_signed_v<U>) {
+        if (x < 0 && c < 0) return T(-1);
+    }
+    return T(0);
+}
+
+// The shift rule for a value x of class T and a count c of class U (a
+// floating count is whole and finite, tested before). Whether the count lies
+// within the width is asked once: of an integer count exactly, as one
+// unsigned compare; of a floating count as a double, which holds every count
+// near the width exactly.
+template <class T, class U>
+struct bitshiftVVFtor {
+    static constexpr unsigned long parallelLimit = limits::bitshiftCountArray;
+
+    int nbits;  // the width of T
+
+    T operator()(T x, U c) const noexcept {
+        if (!withinWidth(c)) return shiftedOut(x, c);
+        const int k = static_cast<int>(c);
+        return k > 0 ? shiftLeftWithin(x, k) : shiftRightWithin(x, -k);
+    }
+
+private:
+    // -nbits < c < nbits. For a signed count, c + nbits - 1 read as unsigned
+    // 64-bit (wrapping) is at most 2 nbits - 2 exactly then.
+    bool withinWidth(U c) const noexcept {
+        const auto w = static_cast<std::uint64_t>(nbits);
+        if constexpr (std::is_floating_point_v<U>) {
+            const double d = c;
+            return d < nbits && d > -nbits;
+        } else if constexpr (std::is_signed_v<U>) {
+            return static_cast<std::uint64_t>(static_cast<std::int64_t>(c)) + (w - 1) <= 2 * w - 2;
+        } else {
+            return static_cast<std::uint64_t>(c) < w;
+        }
+    }
+};
+
+// The shift rule on doubles: x, a whole number that class T holds, and c, a
+// whole finite count, both tested before. The shifted value goes back to a
+// double exactly, as it holds no more significant bits than x did.
+template <class T>
+struct BitshiftFtor {
+    static constexpr unsigned long parallelLimit = limits::bitshiftOnDouble;
+
+    double operator()(double x, double c) const noexcept {
+        constexpr double w = bitWidth<T>;
+        if (!(std::fabs(c) < w)) return x < 0 && c < 0 ? -1.0 : 0.0;
+        const int k = static_cast<int>(c);
+        const T value = wholeDoubleTo<T>(x);
+        return integerToDouble(k > 0 ? shiftLeftWithin(value, k) : shiftRightWithin(value, -k));
+    }
+};
+
+}  // namespace bitfcns

@@ -1,0 +1,7 @@
+// The host's math utility routines that the functions call: element-wise
+// AND, OR and XOR under implicit expansion, and the integer complement loop.
+// Function folders reach the host through frame/ only; this is their way to
+// these routines.
+#pragma once
+
+#include "host/math_utils.hpp"

@@ -1,0 +1,103 @@
+# bitfcns.dask: the same results as one call on the whole arrays, lazily,
+# with the right dtype and meta, whatever the chunks; refusals as one call on
+# the whole arrays would raise them, whichever chunk fails first.
+import dask
+import dask.array as da
+import numpy as np
+import pytest
+
+import bitfcns
+import bitfcns.dask as bd
+from bitfcns import BitfcnsError
+
+
+def chunked(array, chunks):
+    return da.from_array(array, chunks=chunks)
+
+
+rng = np.random.default_rng(3)
+bytes_2x9 = rng.integers(0, 256, (2, 9), dtype=np.uint8)
+doubles_9 = rng.integers(0, 2**40, 9).astype(float)
+
+CASES = [
+    ("bitand", (chunked(bytes_2x9, (1, 4)), chunked(bytes_2x9[:1], (1, 3)))),
+    ("bitor", (chunked(doubles_9, 2), 7.0)),
+    ("bitxor", (chunked(bytes_2x9[:, :1], 1), bytes_2x9[0])),  # broadcast (2, 1) with (9,)
+    ("bitcmp", (chunked(doubles_9, 4), "uint64")),
+    ("bitget", (chunked(bytes_2x9, (2, 5)), chunked(bytes_2x9 % 8 + 1, (1, 3)))),
+    ("bitset", (chunked(doubles_9, 3), 40, chunked(doubles_9 % 2, 4))),
+    ("bitshift", (chunked(bytes_2x9, 3), np.array([[-3]], np.int8))),
+]
+
+
+@pytest.mark.parametrize("name, operands", CASES, ids=[case[0] for case in CASES])
+def test_chunked_results_equal_one_whole_call(name, operands):
+    if name not in bitfcns.available_functions():
+        pytest.skip(f"libbitfcns.so doesn't define {name} yet")
+    result = getattr(bd, name)(*operands)
+    whole = getattr(bitfcns, name)(*[op.compute() if isinstance(op, da.Array) else op for op in operands])
+    assert result.dtype == whole.dtype and result._meta.dtype == whole.dtype
+    assert result.shape == whole.shape and type(result._meta) is np.ndarray
+    for scheduler in ("sync", "threads"):
+        np.testing.assert_array_equal(result.compute(scheduler=scheduler), whole)
+
+
+def test_nothing_is_computed_until_asked():
+    calls = []
+
+    def load():
+        calls.append(1)
+        return np.arange(4, dtype=np.uint8)
+
+    lazy = da.from_delayed(dask.delayed(load)(), shape=(4,), dtype=np.uint8)
+    result = bd.bitxor(bd.bitcmp(lazy), lazy)
+    assert not calls
+    np.testing.assert_array_equal(result.compute(), np.full(4, 255, np.uint8))
+
+
+def test_refusals_of_classes_and_sizes_come_at_once():
+    bytes_ = chunked(np.zeros(10, np.uint8), 3)
+    with pytest.raises(BitfcnsError) as raised:
+        bd.bitand(bytes_, chunked(np.zeros(9, np.uint8), 3))
+    assert raised.value.identifier == "VESPRA:Bitand:sizeMismatch"
+    with pytest.raises(BitfcnsError) as raised:
+        bd.bitand(bytes_, chunked(np.zeros(10), 3))  # a double array isn't a scalar
+    assert raised.value.identifier == "VESPRA:Bitand:mixedClasses"
+    # A one-element double array is a scalar partner, in every chunk too.
+    np.testing.assert_array_equal(bd.bitand(bytes_, np.ones((1, 1))).compute(), np.zeros((1, 10)))
+
+
+def values_before_counts(a, count):
+    """Stands for a function that tests all values, then all counts."""
+    if np.any(a < 0):
+        raise BitfcnsError("bad value", "VESPRA:bitshift:outOfRange")
+    if np.any(count < 0):
+        raise BitfcnsError("bad count", "VESPRA:bitshift:inputsMustBeIntegers")
+    return a
+
+
+@pytest.mark.parametrize("scheduler", ["sync", "threads"])
+@pytest.mark.parametrize("bad_counts", ["first chunks", "scalar"])
+def test_the_earliest_operand_with_a_fault_decides_whichever_chunk_fails_first(scheduler, bad_counts):
+    values = np.ones(40)
+    values[-1] = -1  # the last chunk has a bad value
+    counts = np.ones(40)
+    counts[:5] = -1
+    count_operand = chunked(counts, 5) if bad_counts == "first chunks" else -1.0
+    lazy = bd._apply(values_before_counts, (chunked(values, 5), count_operand))
+    with pytest.raises(BitfcnsError) as raised:
+        lazy.compute(scheduler=scheduler)
+    assert raised.value.identifier == "VESPRA:bitshift:outOfRange"
+    assert raised.value.message == "bad value"
+
+
+@pytest.mark.needs("bitshift")
+def test_a_bad_value_in_the_last_chunk_wins_over_a_bad_count_in_the_first():
+    values = np.arange(20.0)
+    values[-1] = 0.5
+    counts = np.ones(20)
+    counts[0] = np.nan
+    lazy = bd.bitshift(chunked(values, 4), chunked(counts, 4))
+    with pytest.raises(BitfcnsError) as raised:
+        lazy.compute()
+    assert raised.value.identifier == "VESPRA:bitshift:outOfRange"
