@@ -4,7 +4,7 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
-packages=(g++ clang-14 cmake make libtbb-dev libboost-dev libgtest-dev libbenchmark-dev libedit-dev)
+packages=(g++ clang-14 libclang-rt-14-dev cmake make libtbb-dev libboost-dev libgtest-dev libbenchmark-dev libedit-dev)
 # The Python module and its tests, for Debian's /usr/bin/python3.
 packages+=(python3-dev pybind11-dev python3-numpy python3-pytest python3-hypothesis python3-dask
   python3-distributed python3-matplotlib python3-mypy)

@@ -1,10 +1,9 @@
 // bitset through its entry point against a plain model on bit patterns:
-// every class combination reaching its kernel, positions of every class,
 // serial against parallel runs at each limit, fresh and in place, and no
 // array left behind. The call forms, the truth of V and the refusals are in
-// bitset.case.
+// bitset.case; every class combination and position is checked against the
+// reference model by the fuzz target.
 #include "bitfcns/entry_points.hpp"
-#include "bitset/bitset_functors.hpp"
 #include "engine/parallel_limits.hpp"
 #include "host/array_factory.hpp"
 #include "host/host_control.hpp"
@@ -13,24 +12,15 @@
 #include <gtest/gtest.h>
 
 #include <bit>
-#include <cmath>
 #include <cstdint>
 #include <cstring>
-#include <limits>
 
 namespace {
 
 using namespace testing_support;
 using Bits = std::uint64_t;
 
-constexpr double nan = std::numeric_limits<double>::quiet_NaN();
-constexpr double inf = std::numeric_limits<double>::infinity();
 constexpr zqClassID noValue = zqNoClass;
-const zqClassID valueClasses[] = {noValue,      zqLogicalClass, zqDoubleClass, zqSingleClass,
-                                  zqInt8Class,  zqUInt8Class,   zqInt16Class,  zqUInt16Class,
-                                  zqInt32Class, zqUInt32Class,  zqInt64Class,  zqUInt64Class};
-const std::span<const zqClassID> positionClasses(valueClasses + 2, 10);
-const std::span<const zqClassID> integerClasses(valueClasses + 4, 8);
 
 unsigned widthOf(zqClassID cls) { return static_cast<unsigned>(host::elementSize(cls) * 8); }
 
@@ -61,76 +51,6 @@ CallOutcome bitset(const zqArraySlot& a, const zqArraySlot& bit, const zqArraySl
 
 // Every test fails if it leaves an array behind.
 class Bitset : public LeakCheckedTest {};
-
-// A pair of A; BIT and V each one element or a pair. V's pair is true then
-// false, a single V false, no V true.
-TEST_F(Bitset, EveryClassCombinationReachesItsKernel) {
-    for (zqClassID aClass : integerClasses)
-        for (zqClassID bitClass : positionClasses)
-            for (zqClassID valueClass : valueClasses)
-                for (unsigned shape = 0; shape < 4; ++shape) {
-                    const bool bitPair = shape & 1, valuePair = shape & 2;
-                    SCOPED_TRACE(testing::Message() << aClass << bitClass << valueClass << shape);
-                    const double width = widthOf(aClass);
-                    const auto a = arrayOf(aClass, {5, 100});
-                    const auto outcome = bitset(
-                        a,
-                        arrayOf(bitClass, bitPair ? std::vector{width, 3.0} : std::vector{width}),
-                        arrayOf(valueClass, valuePair ? std::vector{2.0, 0.0} : std::vector{0.0}));
-                    ASSERT_EQ(outcome.error, "");
-                    ASSERT_EQ(host::classOf(*outcome.result), aClass);
-                    for (unsigned long i : {0, 1}) {
-                        const bool set = valueClass == noValue || (valuePair && i == 0);
-                        const auto b = static_cast<unsigned>(bitPair && i == 1 ? 3 : width);
-                        EXPECT_EQ(bitsAt(outcome.result.get(), i),
-                                  withBit(bitsAt(a.get(), i), b, set, widthOf(aClass)));
-                    }
-                }
-}
-
-// The double path's functor agrees with the integer path's in every class:
-// a double holding a value of T, with the top bit, the lowest or another set
-// or cleared, comes back as the double nearest to the new value of T.
-template <class T>
-class DoubleFunctor : public ::testing::Test {};
-TYPED_TEST_SUITE(DoubleFunctor, IntegerTypes);
-
-TYPED_TEST(DoubleFunctor, AgreesWithTheIntegerFunctor) {
-    using T = TypeParam;
-    constexpr int width = sizeof(T) * 8;
-    // All ones, except in uint64, where no double holds it.
-    const T ones = T(std::is_signed_v<T> || width < 64 ? -1 : 5);
-    for (T a : {T(0), T(1), ones, std::numeric_limits<T>::min(), T(T(1) << (width - 2))})
-        for (int b : {1, 2, width - 1, width})
-            for (bool v : {false, true})
-                EXPECT_EQ(bitfcns::BitsetFtor<T>{}(static_cast<double>(a), b, v),
-                          static_cast<double>(bitfcns::bitsetVVVFtor<T, bool>{}(a, b, v)))
-                    << +a << " " << b << " " << v;
-}
-
-// 0, 1, the width and one past it, -1 and 2^40 in every class, and the odd
-// floating values; alone and after a valid position. A refused call leaves
-// A as it was though the result would share its storage.
-TEST_F(Bitset, PositionsAreWholeNumbersFromOneToTheWidth) {
-    for (zqClassID aClass : {zqUInt8Class, zqInt16Class, zqUInt32Class, zqInt64Class})
-        for (zqClassID bitClass : positionClasses) {
-            const double width = widthOf(aClass);
-            for (double b : {0.0, 1.0, width, width + 1, -1.0, 1099511627776.0, -0.0, inf, -inf,
-                             0.5, width - 0.5, nan}) {
-                const bool whole = b == std::floor(b);
-                if (bitClass >= zqInt8Class && !whole) continue;  // would be rounded
-                SCOPED_TRACE(testing::Message() << aClass << " " << bitClass << " " << b);
-                const bool valid = whole && b >= 1 && b <= width;
-                for (const auto& bits : {std::vector{b}, std::vector{1.0, b}}) {
-                    const auto a = arrayOf(aClass, {2, 4});
-                    host::setWantsSharedResult(*a, true);
-                    EXPECT_EQ(bitset(a, arrayOf(bitClass, bits), nullptr).error,
-                              valid ? "" : "VESPRA:bitSetGet:BITOutOfRange");
-                    EXPECT_TRUE(valid || bitsAt(a.get(), 0) == 2);
-                }
-            }
-        }
-}
 
 // One run below the limit of each route and one at it, fresh and in place,
 // against the model (the engine's tests take the SIMD families through
