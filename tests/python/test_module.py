@@ -192,15 +192,11 @@ def test_the_gil_is_released_while_the_library_runs():
     assert turns > 0
 
 
-def documented_objects():
-    yield bitfcns.BitfcnsError
-    yield bitfcns.available_functions
-    for name in bitfcns.__all__[2:]:
-        yield getattr(bitfcns, name)
-        yield getattr(bitfcns.dask, name)
+DOCUMENTED = [bitfcns.BitfcnsError, bitfcns.available_functions] + [
+    getattr(module, name) for name in bitfcns.__all__[2:] for module in (bitfcns, bitfcns.dask)]
 
 
-@pytest.mark.parametrize("documented", list(documented_objects()), ids=lambda o: f"{o.__module__}.{o.__name__}")
+@pytest.mark.parametrize("documented", DOCUMENTED, ids=lambda o: f"{o.__module__}.{o.__name__}")
 def test_docstring_examples(documented):
     finder = doctest.DocTestFinder(recurse=False)
     runner = doctest.DocTestRunner(optionflags=doctest.ELLIPSIS | doctest.NORMALIZE_WHITESPACE)
