@@ -39,8 +39,7 @@ def test_a_local_cluster_gives_the_single_machine_result():
             a, b = lazy_pattern(2654435761), lazy_pattern(40503)
             lazy = bd.bitxor(bd.bitcmp(a), b)
             distributed_result = client.compute(lazy).result()
-            has_shift = "bitshift" in bitfcns.available_functions()
-            shifted = client.compute(bd.bitshift(a, b[:1].astype(np.int8) - 3)).result() if has_shift else None
+            shifted = client.compute(bd.bitshift(a, b[:1].astype(np.int8) - 3)).result()
             refusal = client.compute(bd.bitand(a[:1000].astype(float) - 1.0, 1.0)).exception()
     finally:
         cluster.close()
@@ -50,7 +49,7 @@ def test_a_local_cluster_gives_the_single_machine_result():
         for multiplier in (2654435761, 40503)
     )
     assert np.array_equal(distributed_result, bitfcns.bitxor(bitfcns.bitcmp(whole_a), whole_b))
-    if shifted is not None:  # a count of one element against every chunk
-        assert np.array_equal(shifted, bitfcns.bitshift(whole_a, whole_b[:1].astype(np.int8) - 3))
+    # A count of one element against every chunk.
+    assert np.array_equal(shifted, bitfcns.bitshift(whole_a, whole_b[:1].astype(np.int8) - 3))
     # The first element is -1: the refusal of one call on the whole array.
     assert isinstance(refusal, bitfcns.BitfcnsError) and refusal.identifier == "VESPRA:Bitand:outOfRange"
