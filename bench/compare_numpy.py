@@ -341,7 +341,9 @@ def count_label(n):
 def format_seconds(s):
     if s < 1e-3:
         return f"{s * 1e6:.3g} us"
-    return f"{s * 1e3:.3g} ms"
+    if s < 1:
+        return f"{s * 1e3:.3g} ms"
+    return f"{s:.3g} s"
 
 
 def cell(text):
