@@ -315,11 +315,15 @@ def numpy_simd():
             [f for f in dispatch if not features.get(f)])
 
 
-def header(bench_context):
+def load_average():
+    return " ".join(f"{x:.2f}" for x in os.getloadavg())
+
+
+def header(bench_context, load_at_start):
     baseline, found, not_found = numpy_simd()
-    load = os.getloadavg()
     lines = [
-        f"CPU: {cpu_name()}, {os.cpu_count()} logical CPUs; load average {load[0]:.2f} {load[1]:.2f} {load[2]:.2f}",
+        f"CPU: {cpu_name()}, {os.cpu_count()} logical CPUs; "
+        f"load average {load_at_start} at the start, {load_average()} at the end",
         f"NumPy {np.__version__} (Python {platform.python_version()}), one thread per ufunc call",
         f"NumPy SIMD: baseline {' '.join(baseline)}; dispatched and found {' '.join(found) or '-'}; "
         f"dispatched, not on this CPU {' '.join(not_found) or '-'}",
@@ -422,7 +426,7 @@ def main():
 
     cases = [c for c in all_cases() if re.search(args.filter, c.library)]
     library, numpy, context = {}, {}, {}
-    started = time.time()
+    started, load_at_start = time.time(), load_average()
     for case in cases:
         # Each case both ways back to back, so that a change of load hits both.
         library[case.library], context = time_library(args.bench, case, counts, min_time, repetitions)
@@ -431,7 +435,7 @@ def main():
             numpy[case.library][n] = time_numpy(case.setup(n), min_time, repetitions)
         print(f"  {case.library}: done", file=sys.stderr, flush=True)
 
-    title = header(context)
+    title = header(context, load_at_start)
     title.append(f"{repetitions} repetitions of at least {min_time} s, medians; "
                  f"{time.time() - started:.0f} s in all")
     print("\n".join(title) + "\n")
