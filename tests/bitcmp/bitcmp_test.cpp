@@ -15,26 +15,21 @@ void expectAsModel(const std::vector<const zqArray_tag*>& inputs) {
     expectModelOutcome(reference::Function::bitcmp, &ondelBitCmpFcn, inputs);
 }
 
-zqArraySlot flagged(const std::vector<double>& values, bool inPlace = true) {
-    auto array = makeOf(values);
-    host::setWantsSharedResult(*array, inPlace);
-    return array;
-}
-
 TEST(Bitcmp, SerialAndParallelRunsFreshAndInPlace) {
     const auto uint16 = host::makeCharArray(u"uint16");
     for (unsigned long n : {bitfcns::limits::bitcmpOnDouble - 1, bitfcns::limits::bitcmpOnDouble}) {
         std::vector<double> values(n);
         for (unsigned long i = 0; i < n; ++i) values[i] = static_cast<double>((i * 7919) % 65536);
         for (bool inPlace : {false, true})
-            expectAsModel({flagged(values, inPlace).get(), uint16.get()});
+            expectAsModel({flagged(makeOf(values), inPlace).get(), uint16.get()});
     }
 }
 
 // Every element is tested before any is written: the bad one stands last.
 TEST(Bitcmp, RefusedCallWritesNothingIntoSharedStorage) {
-    expectAsModel({flagged({1, 2, 3, 65536}).get(), host::makeCharArray(u"uint16").get()});
-    expectAsModel({flagged({1, 2, 3, 0.5}).get()});
+    expectAsModel(
+        {flagged(makeOf<double>({1, 2, 3, 65536})).get(), host::makeCharArray(u"uint16").get()});
+    expectAsModel({flagged(makeOf<double>({1, 2, 3, 0.5})).get()});
 }
 
 }  // namespace

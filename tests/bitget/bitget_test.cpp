@@ -20,11 +20,6 @@ void expectAsModel(const std::vector<const zqArray_tag*>& inputs) {
     expectModelOutcome(reference::Function::bitget, &ondelBitGetFcn, inputs);
 }
 
-zqArraySlot flagged(zqArraySlot array, bool inPlace = true) {
-    host::setWantsSharedResult(*array, inPlace);
-    return array;
-}
-
 // Positions 1 to the width in turn, as doubles.
 std::vector<double> positions(unsigned long n, unsigned width) {
     std::vector<double> p(n);

@@ -68,8 +68,7 @@ TEST(Bitset, SerialAndParallelRunsAgreeAtEveryLimit) {
                     if (c.bitArray) positions[i] = static_cast<double>(i % width + 1);
                     if (c.valueArray) values[i] = static_cast<double>(i % 3);
                 }
-                const auto a = randomOf(c.aClass, n);
-                host::setWantsSharedResult(*a, inPlace);
+                const auto a = flagged(randomOf(c.aClass, n), inPlace);
                 const auto bit = converted(positions, c.bitClass);
                 std::vector<const zqArray_tag*> inputs{a.get(), bit.get()};
                 const auto value =
@@ -81,8 +80,7 @@ TEST(Bitset, SerialAndParallelRunsAgreeAtEveryLimit) {
 
 // The bad position stands last, after every other has been converted.
 TEST(Bitset, RefusedCallWritesNothingIntoFlaggedStorage) {
-    const auto a = randomOf(zqUInt8Class, 5);
-    host::setWantsSharedResult(*a, true);
+    const auto a = flagged(randomOf(zqUInt8Class, 5));
     expectAsModel({a.get(), makeOf<unsigned char>({1, 2, 3, 4, 9}).get(),
                    makeOf<short>({1, 0, 1, 0, 1}).get()});
 }

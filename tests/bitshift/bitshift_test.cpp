@@ -20,11 +20,6 @@ void expectAsModel(const std::vector<const zqArray_tag*>& inputs) {
     expectModelOutcome(reference::Function::bitshift, &ondelBitShiftFcn, inputs);
 }
 
-zqArraySlot flagged(zqArraySlot array, bool inPlace = true) {
-    host::setWantsSharedResult(*array, inPlace);
-    return array;
-}
-
 // n elements of class `cls`, each `value`.
 zqArraySlot arrayOf(zqClassID cls, long double value, unsigned long n) {
     return host::visitElementClass<host::NumericElements>(

@@ -8,29 +8,15 @@ namespace {
 
 using namespace testing_support;
 
-struct Bitand {
-    static constexpr EntryPoint entry = ondelBitAndFcn;
-    static constexpr const char* group = "VESPRA:Bitand";
-};
-struct Bitor {
-    static constexpr EntryPoint entry = ondelBitOrFcn;
-    static constexpr const char* group = "VESPRA:Bitor";
-};
-struct Bitxor {
-    static constexpr EntryPoint entry = ondelBitXorFcn;
-    static constexpr const char* group = "VESPRA:bitxor";
-};
+class BitLogic : public LeakCheckedTest {};
 
-template <class Function>
-class BitLogicTest : public LeakCheckedTest {};
-using Functions = ::testing::Types<Bitand, Bitor, Bitxor>;
-TYPED_TEST_SUITE(BitLogicTest, Functions);
-
-TYPED_TEST(BitLogicTest, TwoFaultsYieldTheEarlierTest) {
-    const auto refusal = [](std::vector<const zqArray_tag*> inputs) {
-        return callEntry(TypeParam::entry, std::move(inputs));
-    };
-    const auto id = [](const char* leaf) { return std::string(TypeParam::group) + ":" + leaf; };
+TEST_F(BitLogic, TwoFaultsYieldTheEarlierTest) {
+    const struct {
+        EntryPoint entry;
+        const char* group;
+    } functions[] = {{ondelBitAndFcn, "VESPRA:Bitand"},
+                     {ondelBitOrFcn, "VESPRA:Bitor"},
+                     {ondelBitXorFcn, "VESPRA:bitxor"}};
     const auto sparseComplex = makeOf<double>({1, 2});
     host::setSparse(*sparseComplex, true);
     const auto complexDouble = makeOf<double>({1, 2});
@@ -47,16 +33,23 @@ TYPED_TEST(BitLogicTest, TwoFaultsYieldTheEarlierTest) {
     const auto minusOne = scalarOf<double>(-1);
     const auto big = scalarOf<double>(300);
 
-    EXPECT_EQ(refusal({sparseComplex.get()}), "VESPRA:minrhs");
-    EXPECT_EQ(refusal({complexDouble.get(), sparseComplex.get()}), id("sparseArgs"));
-    EXPECT_EQ(refusal({complexDouble.get(), text.get()}), id("operandsNotNumeric"));
-    EXPECT_EQ(refusal({single3.get(), complexDouble.get()}), id("complexInputs"));
-    EXPECT_EQ(refusal({single3.get(), double2.get()}), id("firstArgsNotInt"));
-    EXPECT_EQ(refusal({u8x3.get(), i8x2.get()}), id("sizeMismatch"));
-    EXPECT_EQ(refusal({u8x2.get(), i8x2.get(), badName.get()}), id("mixedClasses"));
-    EXPECT_EQ(refusal({single3.get(), double2.get(), badName.get()}), id("firstArgsNotInt"));
-    EXPECT_EQ(refusal({minusOne.get(), double2.get(), badName.get()}), id("unknownTypeString"));
-    EXPECT_EQ(refusal({u8x2.get(), big.get(), int8Name.get()}), id("invalidTypeString"));
+    for (const auto& function : functions) {
+        SCOPED_TRACE(function.group);
+        const auto refusal = [&](std::vector<const zqArray_tag*> inputs) {
+            return callEntry(function.entry, std::move(inputs));
+        };
+        const auto id = [&](const char* leaf) { return std::string(function.group) + ":" + leaf; };
+        EXPECT_EQ(refusal({sparseComplex.get()}), "VESPRA:minrhs");
+        EXPECT_EQ(refusal({complexDouble.get(), sparseComplex.get()}), id("sparseArgs"));
+        EXPECT_EQ(refusal({complexDouble.get(), text.get()}), id("operandsNotNumeric"));
+        EXPECT_EQ(refusal({single3.get(), complexDouble.get()}), id("complexInputs"));
+        EXPECT_EQ(refusal({single3.get(), double2.get()}), id("firstArgsNotInt"));
+        EXPECT_EQ(refusal({u8x3.get(), i8x2.get()}), id("sizeMismatch"));
+        EXPECT_EQ(refusal({u8x2.get(), i8x2.get(), badName.get()}), id("mixedClasses"));
+        EXPECT_EQ(refusal({single3.get(), double2.get(), badName.get()}), id("firstArgsNotInt"));
+        EXPECT_EQ(refusal({minusOne.get(), double2.get(), badName.get()}), id("unknownTypeString"));
+        EXPECT_EQ(refusal({u8x2.get(), big.get(), int8Name.get()}), id("invalidTypeString"));
+    }
 }
 
 }  // namespace

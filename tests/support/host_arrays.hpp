@@ -13,7 +13,6 @@
 #include <exception>
 #include <span>
 #include <string>
-#include <type_traits>
 #include <vector>
 
 namespace testing_support {
@@ -29,12 +28,7 @@ inline constexpr zqClassID classIdOf = host::elementClassOf<T>;
 template <class T>
 zqArraySlot makeOf(const std::vector<T>& values, host::Dims dims = {}) {
     if (dims.empty()) dims = {1, values.size()};
-    if constexpr (std::is_same_v<T, bool>) {
-        std::vector<unsigned char> bytes(values.begin(), values.end());
-        return host::makeArray(classIdOf<T>, dims, std::span<const unsigned char>(bytes));
-    } else {
-        return host::makeArray(classIdOf<T>, dims, std::span<const T>(values));
-    }
+    return host::makeArray(classIdOf<T>, dims, std::span<const T>(values));
 }
 
 template <class T>

@@ -2,6 +2,7 @@
 // on the same operands.
 #pragma once
 
+#include "host/host_control.hpp"
 #include "tests/reference/reference_model.hpp"
 #include "tests/support/host_arrays.hpp"
 
@@ -10,43 +11,11 @@
 
 namespace testing_support {
 
-namespace detail {
-inline void compareWithModel(reference::Function function, EntryPoint entry,
-                             const std::vector<const zqArray_tag*>& inputs) {
-    std::vector<reference::Operand> operands;
-    for (const zqArray_tag* a : inputs) {
-        const auto* bytes = static_cast<const unsigned char*>(a->data);
-        const std::size_t size = host::elementCount(*a) * host::elementSize(host::classOf(*a));
-        reference::Operand& op = operands.emplace_back();
-        op.cls = host::classOf(*a);
-        op.wantsShared = (a->flags & zqSharedResultFlag) != 0;
-        op.dims = host::dimensions(*a);
-        op.bytes.assign(bytes, bytes + size);
-    }
-    const reference::Outcome expected = reference::call(function, 1, operands);
-    zqArraySlot result;
-    ASSERT_EQ(callEntry(entry, inputs, &result), expected.error) << "the library, then the model";
-    if (!expected.error.empty()) {
-        EXPECT_EQ(result != nullptr, expected.slotFilled);
-        for (std::size_t i = 0; i < inputs.size(); ++i) {
-            const auto* now = static_cast<const unsigned char*>(inputs[i]->data);
-            EXPECT_TRUE(std::equal(operands[i].bytes.begin(), operands[i].bytes.end(), now))
-                << "a refused call changed operand " << i;
-        }
-        return;
-    }
-    ASSERT_EQ(host::classOf(*result), expected.cls);
-    ASSERT_EQ(host::dimensions(*result), expected.dims);
-    EXPECT_EQ(host::storageIdentity(*result) == host::storageIdentity(*inputs[0]),
-              expected.sharesFirst);
-    const auto* got = static_cast<const unsigned char*>(result->data);
-    const long size = static_cast<long>(host::elementSize(expected.cls));
-    const long firstWrong = std::mismatch(expected.bytes.begin(), expected.bytes.end(), got).first -
-                            expected.bytes.begin();
-    EXPECT_EQ(firstWrong / size, static_cast<long>(expected.bytes.size()) / size)
-        << "the first wrong element (the count when none is)";
+// `array`, flagged (or not) as one whose storage the result may take over.
+inline zqArraySlot flagged(zqArraySlot array, bool inPlace = true) {
+    host::setWantsSharedResult(*array, inPlace);
+    return array;
 }
-}  // namespace detail
 
 // The model's outcome: the same refusal, with the slot filled only where the
 // model fills it and every operand as it was; or the same class, sizes and
@@ -55,7 +24,42 @@ inline void compareWithModel(reference::Function function, EntryPoint entry,
 inline void expectModelOutcome(reference::Function function, EntryPoint entry,
                                const std::vector<const zqArray_tag*>& inputs) {
     const std::size_t liveBefore = host::liveArrayCount();
-    detail::compareWithModel(function, entry, inputs);
+    [&] {
+        std::vector<reference::Operand> operands;
+        for (const zqArray_tag* a : inputs) {
+            const auto* bytes = static_cast<const unsigned char*>(a->data);
+            const std::size_t size = host::elementCount(*a) * host::elementSize(host::classOf(*a));
+            reference::Operand& op = operands.emplace_back();
+            op.cls = host::classOf(*a);
+            op.wantsShared = (a->flags & zqSharedResultFlag) != 0;
+            op.dims = host::dimensions(*a);
+            op.bytes.assign(bytes, bytes + size);
+        }
+        const reference::Outcome expected = reference::call(function, 1, operands);
+        zqArraySlot result;
+        ASSERT_EQ(callEntry(entry, inputs, &result), expected.error)
+            << "the library, then the model";
+        if (!expected.error.empty()) {
+            EXPECT_EQ(result != nullptr, expected.slotFilled);
+            for (std::size_t i = 0; i < inputs.size(); ++i) {
+                const auto* now = static_cast<const unsigned char*>(inputs[i]->data);
+                EXPECT_TRUE(std::equal(operands[i].bytes.begin(), operands[i].bytes.end(), now))
+                    << "a refused call changed operand " << i;
+            }
+            return;
+        }
+        ASSERT_EQ(host::classOf(*result), expected.cls);
+        ASSERT_EQ(host::dimensions(*result), expected.dims);
+        EXPECT_EQ(host::storageIdentity(*result) == host::storageIdentity(*inputs[0]),
+                  expected.sharesFirst);
+        const auto* got = static_cast<const unsigned char*>(result->data);
+        const long size = static_cast<long>(host::elementSize(expected.cls));
+        const long firstWrong =
+            std::mismatch(expected.bytes.begin(), expected.bytes.end(), got).first -
+            expected.bytes.begin();
+        EXPECT_EQ(firstWrong / size, static_cast<long>(expected.bytes.size()) / size)
+            << "the first wrong element (the count when none is)";
+    }();
     EXPECT_EQ(host::liveArrayCount(), liveBefore) << "array records leaked";
 }
 
