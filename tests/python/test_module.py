@@ -154,23 +154,14 @@ def test_calls_from_many_threads_at_once():
 
 
 def test_the_gil_is_released_while_the_library_runs():
-    # With no forced switches, another thread runs during the calls only if
-    # the calls let go of the GIL.
-    doubles = np.arange(1e6)
-    started, done = threading.Event(), threading.Event()
-
-    def work():
-        started.set()
-        for _ in range(20):
-            bitfcns.bitcmp(doubles)
-        done.set()
-
+    # With no forced switches, this thread counts turns during the calls only
+    # if the calls let go of the GIL.
+    done = threading.Event()
+    worker = threading.Thread(target=lambda: ([bitfcns.bitcmp(np.arange(1e6)) for _ in range(20)], done.set()))
     interval = sys.getswitchinterval()
     sys.setswitchinterval(100)
     try:
-        worker = threading.Thread(target=work)
         worker.start()
-        started.wait()
         turns = 0
         while not done.wait(0.001):
             turns += 1
