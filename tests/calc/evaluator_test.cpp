@@ -114,35 +114,21 @@ std::string humanText(std::string_view source) {
     return out.str() + errors.str();
 }
 
-struct HumanCase {
-    const char* source;
-    const char* shown;
-};
-
-class HumanDisplay : public testing::TestWithParam<HumanCase> {};
-
-TEST_P(HumanDisplay, LaysValuesOutByRowsAndColumns) {
-    EXPECT_EQ(humanText(GetParam().source), GetParam().shown);
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Layouts, HumanDisplay,
-    testing::Values(
-        HumanCase{"[1 2.5; -3 2^64]",
-                  "ans = 2x2 double\n                     1                   2.5\n                "
-                  "    -3  18446744073709551616\n"},
-        HumanCase{"zeros(1, 2, 2)", "ans = 1x2x2 double\n  (:,:,1)\n  0  0\n  (:,:,2)\n  0  0\n"},
-        HumanCase{"['ab'; 'cd']", "ans = 2x2 char\n  'ab'\n  'cd'\n"},
-        HumanCase{"{1, 'a', {}, [1 2]}", "ans = 1x4 cell\n  [1]  'a'  {0x0 cell}  [1x2 double]\n"},
-        HumanCase{"[\"a\" string(missing)]", "ans = 1x2 string\n  \"a\"  <missing>\n"},
-        HumanCase{"complex(1, -2), sparse(true)",
-                  "ans = 1x1 double complex\n  1-2i\nans = 1x1 logical sparse\n  1\n"},
-        HumanCase{"1e300, NaN", "ans = 1x1 double\n  1e300\nans = 1x1 double\n  NaN\n"},
-        HumanCase{"bitcmp(",
-                  "error: 1:8: expected a value, found end of input (bitcalc:syntax)\n"}));
-
-TEST(HumanDisplay, WrapsLongRowsIntoColumnBlocks) {
-    const std::string shown = humanText("1:30");
+TEST(HumanDisplay, LaysValuesOutByRowsAndColumns) {
+    EXPECT_EQ(humanText("[1 2.5; -3 2^64]"),
+              "ans = 2x2 double\n                     1                   2.5\n"
+              "                    -3  18446744073709551616\n");
+    EXPECT_EQ(humanText("zeros(1, 2, 2), ['ab'; 'cd']"),
+              "ans = 1x2x2 double\n  (:,:,1)\n  0  0\n  (:,:,2)\n  0  0\nans = 2x2 char\n  'ab'\n  "
+              "'cd'\n");
+    EXPECT_EQ(
+        humanText("{1, 'a', {}, [1 2]}, [\"a\" string(missing)], complex(1, -2), sparse(true)"),
+        "ans = 1x4 cell\n  [1]  'a'  {0x0 cell}  [1x2 double]\nans = 1x2 string\n  \"a\"  "
+        "<missing>\nans = 1x1 double complex\n  1-2i\nans = 1x1 logical sparse\n  1\n");
+    EXPECT_EQ(humanText("1e300, bitcmp("),
+              "ans = 1x1 double\n  1e300\nerror: 1:15: expected a value, found end of input "
+              "(bitcalc:syntax)\n");
+    const std::string shown = humanText("1:30");  // long rows wrap into blocks of columns
     EXPECT_NE(shown.find("  Columns 1 to 20:\n   1   2"), std::string::npos) << shown;
     EXPECT_NE(shown.find("  Columns 21 to 30:\n  21  22"), std::string::npos) << shown;
 }

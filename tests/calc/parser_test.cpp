@@ -1,6 +1,6 @@
 // The lexer and parser where the golden cases can't look: syntax errors with
-// their positions, statement kinds, recovery after an error, limits and how
-// much the parser reads.
+// their positions, literals kept as values, recovery after an error, limits
+// and how much the parser reads.
 #include "calc/parser.hpp"
 #include "calc/text_join.hpp"
 
@@ -59,24 +59,6 @@ INSTANTIATE_TEST_SUITE_P(
                   "1:1: expected variable names in one row, such as [a, b], before '='"},
         ErrorCase{"[a b] + 1 = f(x)",
                   "1:11: expected an operator or the end of the statement, found '='"}));
-
-TEST(Statements, KindsTargetsAndDisplay) {
-    const std::vector<ParsedItem> items =
-        parseAll("a = 1, b = 2; c\n[p q] = bitand(1, 2);  % comment\nbitcmp\n[a, b]");
-    ASSERT_EQ(items.size(), 6u);
-    const auto& a = std::get<Statement>(items[0]);
-    EXPECT_EQ(a.kind, Statement::Kind::Assignment);
-    EXPECT_EQ(a.targets, std::vector<std::string>{"a"});
-    EXPECT_TRUE(a.displayed);
-    EXPECT_FALSE(std::get<Statement>(items[1]).displayed);
-    EXPECT_EQ(std::get<Statement>(items[2]).kind, Statement::Kind::Expression);
-    const auto& multiple = std::get<Statement>(items[3]);
-    EXPECT_EQ(multiple.kind, Statement::Kind::MultipleAssignment);
-    EXPECT_EQ(multiple.targets, (std::vector<std::string>{"p", "q"}));
-    EXPECT_FALSE(multiple.displayed);
-    EXPECT_EQ(std::get<Statement>(items[4]).pos.line, 3);
-    EXPECT_EQ(std::get<Statement>(items[5]).kind, Statement::Kind::Expression);
-}
 
 // Numbers in brackets are kept as values, not as a tree each: a literal of
 // a million numbers mustn't cost a million trees.

@@ -1,6 +1,5 @@
-// Array records: sizes as the host shows them, refused creation, shared
-// copies and references outliving their source, lent elements, alignment of
-// the storage.
+// Array records: refused creation, shared copies and references outliving
+// their source, lent elements, alignment of the storage.
 #include "host/array_factory.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
@@ -16,18 +15,6 @@ class ArrayRecordTest : public testing_support::LeakCheckedTest {};
 
 zqArraySlot create(const Dims& dims, zqClassID cls = zqDoubleClass) {
     return zqArraySlot(create_uninitnumeric(dims.size(), dims.data(), cls, zqReal, 0, nullptr));
-}
-
-TEST_F(ArrayRecordTest, SizesAreNormalisedTheWayTheHostShowsThem) {
-    const std::pair<Dims, Dims> givenAndShown[] = {
-        {{}, {1, 1}},     {{3}, {3, 1}},      {{2, 3, 1, 1}, {2, 3}}, {{2, 1, 4, 1}, {2, 1, 4}},
-        {{0, 3}, {0, 3}}, {{1, 1, 1}, {1, 1}}};
-    for (const auto& [given, shown] : givenAndShown) {
-        zqArraySlot array = create(given);
-        ASSERT_TRUE(array);
-        EXPECT_EQ(host::dimensions(*array), shown);
-        EXPECT_EQ((array->flags & zqTwoDimensionalFlag) != 0, shown.size() == 2);
-    }
 }
 
 // Only sizes none of which is 0 can overflow the byte count.
