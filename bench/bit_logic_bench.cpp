@@ -1,7 +1,8 @@
-// Benchmarks of bitand, bitor and bitxor through their entry points at 5e6
-// elements (two double arrays also at 1e3 and 5e7): two uint8 arrays (the integer path), two double
-// arrays (the default path: validation, conversion to uint64, the element routine and the
-// conversion back), and a uint8 array with a double scalar.
+// Benchmarks of bitand, bitor and bitxor through their entry points, with a
+// result the host allocates per call: two uint8 or two uint64 arrays (the
+// integer path), two double arrays (the default path: validation, conversion
+// to uint64, the element routine and the conversion back), and a uint8 array
+// with a double scalar.
 #include "bench_support.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "host/array_factory.hpp"
@@ -14,8 +15,6 @@ namespace bitfcns::bench {
 namespace {
 
 using EntryPoint = void (*)(int, zqArraySlot*, int, const zqArray_tag**);
-
-constexpr unsigned long kCount = 5'000'000;
 
 template <class T>
 zqArraySlot operandOf(unsigned long n, unsigned seed) {
@@ -47,15 +46,13 @@ void logicCase(benchmark::State& state) {
 
 template <EntryPoint entry>
 void registerFunction(const std::string& function) {
-    const std::vector<long> counts{static_cast<long>(kCount)};
-    registerCounts(function + "/onInteger/uint8", &logicCase<entry, unsigned char, unsigned char>,
-                   counts);
-    registerCounts(function + "/onDouble/double", &logicCase<entry, double, double>, counts);
-    // The same path by the form of the other families' names, at a call's
-    // smallest and the memory's scale.
-    registerCounts(function + "/onDouble/double/fresh", &logicCase<entry, double, double>,
-                   {1000, 50000000});
-    registerCounts(function + "/onInteger/uint8-doubleScalar",
+    const std::vector<long> counts{1000, 100000, 5000000, 50000000};
+    registerCounts(function + "/onInteger/uint8/fresh",
+                   &logicCase<entry, unsigned char, unsigned char>, counts);
+    registerCounts(function + "/onInteger/uint64/fresh",
+                   &logicCase<entry, unsigned long, unsigned long>, counts);
+    registerCounts(function + "/onDouble/double/fresh", &logicCase<entry, double, double>, counts);
+    registerCounts(function + "/onInteger/uint8-doubleScalar/fresh",
                    &logicCase<entry, unsigned char, double>, counts);
 }
 

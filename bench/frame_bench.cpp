@@ -1,6 +1,8 @@
 // The floating tests of the frame: floor by bit pattern against the library
 // floor, and the element test scanning an array of valid doubles (the
-// validation every double path runs before its loop).
+// validation every double path runs before its loop). Names:
+// frame/<test>/<variant>/<class>/n:N (class: scanned-tested).
+#include "bench_support.hpp"
 #include "frame/floating.hpp"
 
 #include <benchmark/benchmark.h>
@@ -10,6 +12,7 @@
 #include <random>
 #include <vector>
 
+namespace bitfcns::bench {
 namespace {
 
 // Whole and fractional values spread over the three ranges of floorDouble.
@@ -34,9 +37,6 @@ void floorOverArray(benchmark::State& state) {
 
 double libraryFloor(double x) { return std::floor(x); }
 
-BENCHMARK(floorOverArray<bitfcns::floorDouble>)->Arg(1 << 16);
-BENCHMARK(floorOverArray<libraryFloor>)->Arg(1 << 16);
-
 // Every element passes, so the scan runs to the end.
 template <class T>
 void elementTestScan(benchmark::State& state) {
@@ -45,14 +45,22 @@ void elementTestScan(benchmark::State& state) {
     std::uniform_int_distribution<int> small(0, 100);
     for (double& x : values) x = small(random);
     for (auto _ : state) {
-        const bool allFit = std::all_of(values.begin(), values.end(),
-                                        [](double x) { return bitfcns::fitsInteger<T>(x); });
+        const bool allFit =
+            std::all_of(values.begin(), values.end(), [](double x) { return fitsInteger<T>(x); });
         benchmark::DoNotOptimize(allFit);
     }
     state.SetItemsProcessed(state.iterations() * state.range(0));
 }
 
-BENCHMARK(elementTestScan<unsigned char>)->Arg(1 << 20);
-BENCHMARK(elementTestScan<unsigned long>)->Arg(1 << 20);
+[[maybe_unused]] const bool registered = [] {
+    registerCounts("frame/floor/bitPattern/double", &floorOverArray<floorDouble>, {1 << 16});
+    registerCounts("frame/floor/stdFloor/double", &floorOverArray<libraryFloor>, {1 << 16});
+    registerCounts("frame/fitsIntegerScan/double-uint8", &elementTestScan<unsigned char>,
+                   {1 << 20});
+    registerCounts("frame/fitsIntegerScan/double-uint64", &elementTestScan<unsigned long>,
+                   {1 << 20});
+    return true;
+}();
 
 }  // namespace
+}  // namespace bitfcns::bench

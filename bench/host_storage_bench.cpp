@@ -2,6 +2,9 @@
 // written once, memcpy of 100 MB between ready buffers, malloc + write + free
 // of 100 MB, and small arrays made and destroyed; then the host's own work on
 // the path of bitand on doubles (conversion both ways) and on small integers.
+// Names as everywhere in the program: host/<what>/<class>/<output>/n:N, or
+// bytes:B where only bytes matter.
+#include "bench_support.hpp"
 #include "host/array_factory.hpp"
 #include "host/math_utils.hpp"
 #include "host/zq_array.hpp"
@@ -12,73 +15,69 @@
 #include <cstring>
 #include <vector>
 
+namespace bitfcns::bench {
 namespace {
 
-constexpr unsigned long kLargeBytes = 100'000'000;
-
-zqArraySlot uninitialised(zqClassID cls, unsigned long count) {
-    const unsigned long dims[] = {1, count};
-    return zqArraySlot(matrix::detail::create_uninitnumeric(2, dims, cls, zqReal, 0, nullptr));
-}
-
-void BM_HostArrayFreshWrite100MB(benchmark::State& state) {
+void freshWrite(benchmark::State& state) {
+    const auto bytes = static_cast<unsigned long>(state.range(0));
     for (auto _ : state) {
-        zqArraySlot array = uninitialised(zqUInt8Class, kLargeBytes);
-        std::memset(array->data, 1, kLargeBytes);
+        zqArraySlot array = hostResult(zqUInt8Class, bytes);
+        std::memset(array->data, 1, bytes);
         benchmark::DoNotOptimize(array->data);
         benchmark::ClobberMemory();
     }
-    state.SetBytesProcessed(static_cast<long>(state.iterations() * kLargeBytes));
+    reportBytes(state, bytes);
 }
-BENCHMARK(BM_HostArrayFreshWrite100MB)->Unit(benchmark::kMillisecond);
 
-void BM_MemcpyReadyBuffers100MB(benchmark::State& state) {
-    std::vector<char> from(kLargeBytes, 1), to(kLargeBytes, 2);
+void memcpyReadyBuffers(benchmark::State& state) {
+    const auto bytes = static_cast<unsigned long>(state.range(0));
+    std::vector<char> from(bytes, 1), to(bytes, 2);
     for (auto _ : state) {
-        std::memcpy(to.data(), from.data(), kLargeBytes);
+        std::memcpy(to.data(), from.data(), bytes);
         benchmark::DoNotOptimize(to.data());
         benchmark::ClobberMemory();
     }
-    state.SetBytesProcessed(static_cast<long>(state.iterations() * kLargeBytes));
+    reportBytes(state, 2 * bytes);
 }
-BENCHMARK(BM_MemcpyReadyBuffers100MB)->Unit(benchmark::kMillisecond);
 
-void BM_MallocWriteFree100MB(benchmark::State& state) {
+void mallocWriteFree(benchmark::State& state) {
+    const auto bytes = static_cast<unsigned long>(state.range(0));
     for (auto _ : state) {
-        void* block = std::malloc(kLargeBytes);
-        std::memset(block, 1, kLargeBytes);
+        void* block = std::malloc(bytes);
+        std::memset(block, 1, bytes);
         benchmark::DoNotOptimize(block);
         benchmark::ClobberMemory();
         std::free(block);
     }
-    state.SetBytesProcessed(static_cast<long>(state.iterations() * kLargeBytes));
+    reportBytes(state, bytes);
 }
-BENCHMARK(BM_MallocWriteFree100MB)->Unit(benchmark::kMillisecond);
 
-// A record and the storage of 1000 uint8 elements, made and destroyed.
-void BM_SmallArrayCreateDestroy(benchmark::State& state) {
+// A record and the storage of n uint8 elements, made and destroyed.
+void createDestroy(benchmark::State& state) {
+    const auto n = static_cast<unsigned long>(state.range(0));
     for (auto _ : state) {
-        zqArraySlot array = uninitialised(zqUInt8Class, 1000);
+        zqArraySlot array = hostResult(zqUInt8Class, n);
         benchmark::DoNotOptimize(array->data);
     }
 }
-BENCHMARK(BM_SmallArrayCreateDestroy);
 
-// The host's part of a bitand call on 1000 uint8 elements: result included.
-void BM_SmallUInt8Bitand(benchmark::State& state) {
-    const zqArraySlot a = host::makeArray(zqUInt8Class, {1, 1000});
-    const zqArraySlot b = host::makeArray(zqUInt8Class, {1, 1000});
+// The host's element routine of bitand on two arrays of T, result included.
+template <class T>
+void bitandHelper(benchmark::State& state) {
+    const auto n = static_cast<unsigned long>(state.range(0));
+    const zqArraySlot a = host::makeArray(classIdOf<T>(), {1, n});
+    const zqArraySlot b = host::makeArray(classIdOf<T>(), {1, n});
     for (auto _ : state) {
         zqArraySlot result = bitandBsxfunHelper(a.get(), b.get());
         benchmark::DoNotOptimize(result->data);
     }
+    reportBytes(state, 3 * sizeof(T) * n);
 }
-BENCHMARK(BM_SmallUInt8Bitand);
 
-// 5 million doubles holding integers, converted to uint64 and back.
-void BM_ConvertDoubleToUInt64AndBack5M(benchmark::State& state) {
-    constexpr unsigned long count = 5'000'000;
-    zqArraySlot doubles = uninitialised(zqDoubleClass, count);
+// Doubles holding integers, converted to uint64 and back.
+void convertRoundTrip(benchmark::State& state) {
+    const auto count = static_cast<unsigned long>(state.range(0));
+    zqArraySlot doubles = hostResult(zqDoubleClass, count);
     auto* values = static_cast<double*>(doubles->data);
     for (unsigned long i = 0; i < count; ++i)
         values[i] = static_cast<double>(i * 2654435761UL % (1UL << 52));
@@ -87,21 +86,20 @@ void BM_ConvertDoubleToUInt64AndBack5M(benchmark::State& state) {
         auto back = matrix::convert_if_needed(integers.get(), zqDoubleClass);
         benchmark::DoNotOptimize(back->data);
     }
-    state.SetBytesProcessed(static_cast<long>(state.iterations() * count * 2 * sizeof(double)));
+    reportBytes(state, count * 2 * sizeof(double));
 }
-BENCHMARK(BM_ConvertDoubleToUInt64AndBack5M)->Unit(benchmark::kMillisecond)->UseRealTime();
 
-// The AND of two 5-million-element uint64 arrays, result included.
-void BM_UInt64Bitand5M(benchmark::State& state) {
-    constexpr unsigned long count = 5'000'000;
-    const zqArraySlot a = host::makeArray(zqUInt64Class, {1, count});
-    const zqArraySlot b = host::makeArray(zqUInt64Class, {1, count});
-    for (auto _ : state) {
-        zqArraySlot result = bitandBsxfunHelper(a.get(), b.get());
-        benchmark::DoNotOptimize(result->data);
-    }
-    state.SetBytesProcessed(static_cast<long>(state.iterations() * count * sizeof(unsigned long)));
-}
-BENCHMARK(BM_UInt64Bitand5M)->Unit(benchmark::kMillisecond)->UseRealTime();
+[[maybe_unused]] const bool registered = [] {
+    constexpr long largeBytes = 100'000'000;
+    registerCounts("host/freshWrite", &freshWrite, {largeBytes})->ArgName("bytes");
+    registerCounts("host/memcpyReadyBuffers", &memcpyReadyBuffers, {largeBytes})->ArgName("bytes");
+    registerCounts("host/mallocWriteFree", &mallocWriteFree, {largeBytes})->ArgName("bytes");
+    registerCounts("host/createDestroy/uint8", &createDestroy, {1000});
+    registerCounts("host/bitandHelper/uint8/fresh", &bitandHelper<unsigned char>, {1000});
+    registerCounts("host/bitandHelper/uint64/fresh", &bitandHelper<unsigned long>, {5'000'000});
+    registerCounts("host/convertRoundTrip/double-uint64", &convertRoundTrip, {5'000'000});
+    return true;
+}();
 
 }  // namespace
+}  // namespace bitfcns::bench

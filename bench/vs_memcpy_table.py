@@ -17,4 +17,7 @@ for run in runs:
     unit = run["time_unit"]
     seconds = run["real_time"] * {"ns": 1e-9, "us": 1e-6, "ms": 1e-3, "s": 1.0}[unit]
     time = f"{seconds * 1e6:.3f} us" if seconds < 1e-3 else f"{seconds * 1e3:.2f} ms"
-    print(f"| {name} | {time} | {run['bytes_per_second'] / 1e9:.1f} | {run['vs_memcpy']:.2f} |")
+    # Cases that count items, or nothing, rather than bytes have no ratio.
+    rate = f"{run['bytes_per_second'] / 1e9:.1f}" if "bytes_per_second" in run else "-"
+    ratio = f"{run['vs_memcpy']:.2f}" if "vs_memcpy" in run else "-"
+    print(f"| {name} | {time} | {rate} | {ratio} |")

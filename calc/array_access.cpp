@@ -12,7 +12,7 @@ namespace bitcalc {
 
 namespace {
 
-std::size_t arraySizeLimit = std::size_t{1} << 30;
+constexpr std::size_t arraySizeLimit = std::size_t{1} << 30;
 
 std::string bytesText(std::size_t bytes) {
     if (bytes % (std::size_t{1} << 30) == 0) return joinText(std::to_string(bytes >> 30), " GiB");
@@ -100,8 +100,6 @@ void checkArraySize(const Dims& dims, zqClassID cls) {
                      " exceeds bitcalc's limit of ", bytesText(arraySizeLimit), " per array."));
     }
 }
-
-void setArraySizeLimit(std::size_t bytes) { arraySizeLimit = bytes; }
 
 bool isScalar(const zqArray_tag& array) { return host::elementCount(array) == 1; }
 bool isEmpty(const zqArray_tag& array) { return host::elementCount(array) == 0; }

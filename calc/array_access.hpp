@@ -35,11 +35,8 @@ std::string dimsText(const Dims& dims);
 std::size_t elementCountOf(const Dims& dims);
 
 // Raises the evaluator's "too large" error for arrays beyond the size limit,
-// 1 GiB unless set otherwise: the most that bitcalc makes of its own.
+// 1 GiB: the most that bitcalc makes of its own.
 void checkArraySize(const Dims& dims, zqClassID cls);
-
-// Sets the size limit, in bytes; tests lower it to keep random input small.
-void setArraySizeLimit(std::size_t bytes);
 
 bool isScalar(const zqArray_tag& array);
 bool isEmpty(const zqArray_tag& array);

@@ -34,6 +34,27 @@ std::vector<std::string> splitLines(std::string_view text) {
     return lines;
 }
 
+// The case lines of a Markdown file: those of the fenced blocks whose first
+// line begins with ">>". Every other line is left blank, so that a report's
+// line numbers are the file's own.
+std::string casesOfMarkdown(std::string_view content) {
+    std::string cases;
+    bool inBlock = false, atBlockStart = false, caseBlock = false;
+    for (const std::string& line : splitLines(content)) {
+        if (line.starts_with("```")) {
+            inBlock = !inBlock;
+            atBlockStart = inBlock;
+            caseBlock = false;
+        } else if (inBlock) {
+            if (atBlockStart) caseBlock = line.starts_with(">>");
+            atBlockStart = false;
+            if (caseBlock) cases += line;
+        }
+        cases += '\n';
+    }
+    return cases;
+}
+
 std::vector<GoldenCase> parseCases(std::string_view content) {
     std::vector<GoldenCase> cases;
     const std::vector<std::string> lines = splitLines(content);
@@ -67,7 +88,9 @@ GoldenResult checkGoldenCases(std::string_view content, std::string_view fileNam
     std::ostringstream output;
     const auto display = makeCanonicalDisplay(output);
     Evaluator evaluator(*display);
-    for (const GoldenCase& goldenCase : parseCases(content)) {
+    const std::vector<GoldenCase> cases =
+        fileName.ends_with(".md") ? parseCases(casesOfMarkdown(content)) : parseCases(content);
+    for (const GoldenCase& goldenCase : cases) {
         ++result.cases;
         output.str("");
         evaluator.run(goldenCase.statements, true);

@@ -6,7 +6,8 @@
 // follow, up to the next case, are the expected canonical output, one line
 // each. Blank lines and lines starting with '%' are passed over. All cases
 // of a file run in one session, so variables carry over, and an error
-// doesn't stop the cases after it.
+// doesn't stop the cases after it. In a Markdown file (a name ending in
+// ".md") only the fenced blocks whose first line begins with ">>" are read.
 #pragma once
 
 #include <cstddef>

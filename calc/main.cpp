@@ -1,6 +1,7 @@
 // bitcalc: the command line of the evaluator. Runs statements from -e, a
 // file or standard input (interactively at a terminal), or checks golden
 // case files.
+#include "bitfcns/version.hpp"
 #include "calc/display.hpp"
 #include "calc/evaluator.hpp"
 #include "calc/golden_check.hpp"
@@ -32,6 +33,7 @@ constexpr std::string_view helpText = R"(Usage: bitcalc [-k] [--canonical] -e ST
        bitcalc [-k] [--canonical] FILE
        bitcalc [-k] [--canonical]          (statements from standard input)
        bitcalc --check FILE...
+       bitcalc --version
 
 bitcalc evaluates statements in the host's array syntax over the stand-in
 host, calling the seven functions of libbitfcns.so (bitand, bitor, bitxor,
@@ -49,7 +51,9 @@ Options:
   --check FILE...  run golden case files: ">> STATEMENTS" lines, ".. MORE" lines
                  continuing them, then the exact canonical lines expected; blank
                  lines and lines starting with % are passed over. Reports each
-                 mismatch with the file's line number
+                 mismatch with the file's line number. In a Markdown file
+                 (.md) only the fenced blocks that begin with >> are read
+  --version      show the versions of bitcalc and of the loaded libbitfcns.so
   -h, --help     show this text
 
 At a terminal, standard input is read with a prompt, line editing and
@@ -234,6 +238,10 @@ int main(int argc, char** argv) {
         const std::string_view argument = argv[i];
         if (argument == "-h" || argument == "--help") {
             std::cout << helpText;
+            return finishOutput(exitClean);
+        } else if (argument == "--version") {
+            std::cout << "bitcalc " << BITFCNS_VERSION_STRING << " (libbitfcns " << bitfcnsVersion()
+                      << ")\n";
             return finishOutput(exitClean);
         } else if (argument == "-k" || argument == "--keep-going") {
             options.keepGoing = true;

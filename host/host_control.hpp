@@ -24,4 +24,9 @@ void resetLegacyErrors();
 // any failure still pending.
 void failNextAllocations(std::size_t count = 1, std::size_t after = 0);
 
+// Makes every request for more than `bytes` of element storage fail as an
+// allocation failure does (0: no limit), so that a fuzzed program can't take
+// the machine's memory.
+void limitStorageBytes(std::size_t bytes);
+
 }  // namespace host

@@ -36,6 +36,7 @@ constexpr bool kRecycleChunks = true;
 
 std::atomic<std::size_t> pendingSuccesses{0};
 std::atomic<std::size_t> pendingFailures{0};
+std::atomic<std::size_t> storageLimit{0};  // 0: none
 
 // ---------------------------------------------------------------------------
 // Small heap chunks, recycled per thread in power-of-two size classes.
@@ -223,6 +224,8 @@ void failNextAllocations(std::size_t count, std::size_t after) {
     pendingFailures.store(count);
 }
 
+void limitStorageBytes(std::size_t bytes) { storageLimit.store(bytes); }
+
 bool allocationPermitted() noexcept {
     std::size_t successes = pendingSuccesses.load(std::memory_order_relaxed);
     while (successes != 0) {
@@ -271,6 +274,8 @@ StorageBlock* placeLentStorageInChunk(void* where, void* chunk, std::size_t chun
 
 StorageBlock* allocateStorage(std::size_t bytes) noexcept {
     if (!allocationPermitted()) return nullptr;
+    const std::size_t limit = storageLimit.load(std::memory_order_relaxed);
+    if (limit != 0 && bytes > limit) return nullptr;
     if (bytes >= kLargeBlockBytes) return acquireLargeBlock(bytes);
     const std::size_t chunkBytes = sizeof(StorageBlock) + bytes;
     void* chunk = allocateChunk(chunkBytes);

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # Checks the direction of includes, builds the optimised, the sanitizer and
-# the clang configurations, checks the library's exports and runs the whole
-# test suite in all three.
+# the clang configurations, checks the library's exports, runs the whole
+# test suite in all three, then the fuzz targets for about five minutes.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 scripts/check_includes.sh
@@ -10,3 +10,4 @@ scripts/check_exports.sh build/release/libbitfcns.so
 for preset in release sanitize clang; do
   ctest --preset "$preset" -j "$(nproc)"
 done
+scripts/fuzz.sh --ci

@@ -1,161 +1,45 @@
-// bitset through its entry point against a plain model on bit patterns:
-// every class combination reaching its kernel, positions of every class,
-// serial against parallel runs at each limit, fresh and in place, and no
-// array left behind. The call forms, the truth of V and the refusals are in
-// bitset.case.
+// bitset through its entry point against the reference model: one run below
+// the limit of each route and one at it, fresh and in place, and a refused
+// call that writes nothing. The call forms, the truth of V and every class
+// combination are checked against the model by the fuzz target; the engine's
+// tests take the SIMD families through every width.
 #include "bitfcns/entry_points.hpp"
-#include "bitset/bitset_functors.hpp"
 #include "engine/parallel_limits.hpp"
-#include "host/array_factory.hpp"
-#include "host/host_control.hpp"
-#include "tests/support/host_arrays.hpp"
-#include "tests/support/whole_values.hpp"
+#include "tests/support/model_check.hpp"
 
-#include <gtest/gtest.h>
-
-#include <bit>
-#include <cmath>
-#include <cstdint>
-#include <cstring>
-#include <limits>
+#include <random>
 
 namespace {
 
 using namespace testing_support;
-using Bits = std::uint64_t;
 
-constexpr double nan = std::numeric_limits<double>::quiet_NaN();
-constexpr double inf = std::numeric_limits<double>::infinity();
 constexpr zqClassID noValue = zqNoClass;
-const zqClassID valueClasses[] = {noValue,      zqLogicalClass, zqDoubleClass, zqSingleClass,
-                                  zqInt8Class,  zqUInt8Class,   zqInt16Class,  zqUInt16Class,
-                                  zqInt32Class, zqUInt32Class,  zqInt64Class,  zqUInt64Class};
-const std::span<const zqClassID> positionClasses(valueClasses + 2, 10);
-const std::span<const zqClassID> integerClasses(valueClasses + 4, 8);
 
-unsigned widthOf(zqClassID cls) { return static_cast<unsigned>(host::elementSize(cls) * 8); }
+void expectAsModel(const std::vector<const zqArray_tag*>& inputs) {
+    expectModelOutcome(reference::Function::bitset, &ondelBitSetFcn, inputs);
+}
 
-// An array of class `cls` holding `values`, converted by the host; null for
-// noValue.
-zqArraySlot arrayOf(zqClassID cls, const std::vector<double>& values) {
-    if (cls == noValue) return nullptr;
+// `values` converted by the host to class `cls`.
+zqArraySlot converted(const std::vector<double>& values, zqClassID cls) {
     return zqArraySlot(matrix::convert_if_needed(makeOf(values).get(), cls).detach());
 }
 
-Bits bitsAt(const zqArray_tag* array, unsigned long i) {
-    const std::size_t size = host::elementSize(host::classOf(*array));
-    Bits bits = 0;
-    std::memcpy(&bits, static_cast<const char*>(array->data) + i * size, size);
-    return bits;
+// n elements of class `cls`: whole doubles below 2^32, or random bit patterns.
+zqArraySlot randomOf(zqClassID cls, unsigned long n) {
+    std::mt19937_64 random(n);
+    if (cls == zqDoubleClass) {
+        std::vector<double> values(n);
+        for (double& v : values) v = static_cast<double>(random() >> 32);
+        return makeOf(values);
+    }
+    std::vector<std::byte> bytes(n * host::elementSize(cls));
+    for (std::byte& b : bytes) b = static_cast<std::byte>(random());
+    return host::makeArray(cls, {1, n}, bytes);
 }
 
-// The model: bit b (from 1) of `a` set or cleared, cut to `width` bits.
-Bits withBit(Bits a, unsigned b, bool set, unsigned width) {
-    const Bits bits = set ? a | Bits{1} << (b - 1) : a & ~(Bits{1} << (b - 1));
-    return width == 64 ? bits : bits & ((Bits{1} << width) - 1);
-}
-
-CallOutcome bitset(const zqArraySlot& a, const zqArraySlot& bit, const zqArraySlot& value) {
-    if (!value) return callEntry(&ondelBitSetFcn, {a.get(), bit.get()});
-    return callEntry(&ondelBitSetFcn, {a.get(), bit.get(), value.get()});
-}
-
-// Every test fails if it leaves an array behind.
-class Bitset : public LeakCheckedTest {};
-
-// A pair of A; BIT and V each one element or a pair. V's pair is true then
-// false, a single V false, no V true.
-TEST_F(Bitset, EveryClassCombinationReachesItsKernel) {
-    for (zqClassID aClass : integerClasses)
-        for (zqClassID bitClass : positionClasses)
-            for (zqClassID valueClass : valueClasses)
-                for (unsigned shape = 0; shape < 4; ++shape) {
-                    const bool bitPair = shape & 1, valuePair = shape & 2;
-                    SCOPED_TRACE(testing::Message() << aClass << bitClass << valueClass << shape);
-                    const double width = widthOf(aClass);
-                    const auto a = arrayOf(aClass, {5, 100});
-                    const auto outcome = bitset(
-                        a,
-                        arrayOf(bitClass, bitPair ? std::vector{width, 3.0} : std::vector{width}),
-                        arrayOf(valueClass, valuePair ? std::vector{2.0, 0.0} : std::vector{0.0}));
-                    ASSERT_EQ(outcome.error, "");
-                    ASSERT_EQ(host::classOf(*outcome.result), aClass);
-                    for (unsigned long i : {0, 1}) {
-                        const bool set = valueClass == noValue || (valuePair && i == 0);
-                        const auto b = static_cast<unsigned>(bitPair && i == 1 ? 3 : width);
-                        EXPECT_EQ(bitsAt(outcome.result.get(), i),
-                                  withBit(bitsAt(a.get(), i), b, set, widthOf(aClass)));
-                    }
-                }
-}
-
-// The double path's functor agrees with the integer path's in every class:
-// a double holding a value of T, with the top bit, the lowest or another set
-// or cleared, comes back as the double nearest to the new value of T.
-template <class T>
-class DoubleFunctor : public ::testing::Test {};
-TYPED_TEST_SUITE(DoubleFunctor, IntegerTypes);
-
-TYPED_TEST(DoubleFunctor, AgreesWithTheIntegerFunctor) {
-    using T = TypeParam;
-    constexpr int width = sizeof(T) * 8;
-    // All ones, except in uint64, where no double holds it.
-    const T ones = T(std::is_signed_v<T> || width < 64 ? -1 : 5);
-    for (T a : {T(0), T(1), ones, std::numeric_limits<T>::min(), T(T(1) << (width - 2))})
-        for (int b : {1, 2, width - 1, width})
-            for (bool v : {false, true})
-                EXPECT_EQ(bitfcns::BitsetFtor<T>{}(static_cast<double>(a), b, v),
-                          static_cast<double>(bitfcns::bitsetVVVFtor<T, bool>{}(a, b, v)))
-                    << +a << " " << b << " " << v;
-}
-
-// Doubles taken for T with one position or an array of them, and one V, as
-// the functor does.
-TYPED_TEST(DoubleFunctor, OnePositionAgreesWithTheFunctor) {
-    using T = TypeParam;
-    for (double b = 1; b <= sizeof(T) * 8; ++b)
-        for (bool v : {false, true})
-            expectElementsAgree<T>(
-                &ondelBitSetFcn,
-                {testing_support::scalarOf(b).get(), testing_support::scalarOf(v).get()},
-                [b, v](double a) { return bitfcns::BitsetFtor<T>{}(a, b, v); });
-    const auto bits =
-        alongsideWholeValues<T>([](std::size_t i) { return double(i % (sizeof(T) * 8) + 1); });
-    for (bool v : {false, true})
-        expectElementsAgree<T>(
-            &ondelBitSetFcn, {makeOf(bits).get(), testing_support::scalarOf(v).get()},
-            [&](double a, std::size_t i) { return bitfcns::BitsetFtor<T>{}(a, bits[i], v); });
-}
-
-// 0, 1, the width and one past it, -1 and 2^40 in every class, and the odd
-// floating values; alone and after a valid position. A refused call leaves
-// A as it was though the result would share its storage.
-TEST_F(Bitset, PositionsAreWholeNumbersFromOneToTheWidth) {
-    for (zqClassID aClass : {zqUInt8Class, zqInt16Class, zqUInt32Class, zqInt64Class})
-        for (zqClassID bitClass : positionClasses) {
-            const double width = widthOf(aClass);
-            for (double b : {0.0, 1.0, width, width + 1, -1.0, 1099511627776.0, -0.0, inf, -inf,
-                             0.5, width - 0.5, nan}) {
-                const bool whole = b == std::floor(b);
-                if (bitClass >= zqInt8Class && !whole) continue;  // would be rounded
-                SCOPED_TRACE(testing::Message() << aClass << " " << bitClass << " " << b);
-                const bool valid = whole && b >= 1 && b <= width;
-                for (const auto& bits : {std::vector{b}, std::vector{1.0, b}}) {
-                    const auto a = arrayOf(aClass, {2, 4});
-                    host::setWantsSharedResult(*a, true);
-                    EXPECT_EQ(bitset(a, arrayOf(bitClass, bits), nullptr).error,
-                              valid ? "" : "VESPRA:bitSetGet:BITOutOfRange");
-                    EXPECT_TRUE(valid || bitsAt(a.get(), 0) == 2);
-                }
-            }
-        }
-}
-
-// One run below the limit of each route and one at it, fresh and in place,
-// against the model (the engine's tests take the SIMD families through
-// every width). Position i is i modulo the width, plus 1; V is true unless i is a
-// multiple of 3. A double A holds whole numbers below 2^32.
-TEST_F(Bitset, SerialAndParallelRunsAgreeAtEveryLimit) {
+// Position i is i modulo the width, plus 1; V is true unless i is a multiple
+// of 3 (a scalar V is 0).
+TEST(Bitset, SerialAndParallelRunsAgreeAtEveryLimit) {
     using namespace bitfcns::limits;
     const struct {
         zqClassID aClass, bitClass, valueClass;
@@ -176,53 +60,41 @@ TEST_F(Bitset, SerialAndParallelRunsAgreeAtEveryLimit) {
         for (unsigned long n : {c.limit - 1, c.limit})
             for (bool inPlace : {false, true}) {
                 SCOPED_TRACE(testing::Message() << c.aClass << " " << n << " " << inPlace);
-                const bool onDouble = c.aClass == zqDoubleClass;
-                const unsigned width = widthOf(onDouble ? zqUInt64Class : c.aClass);
-                const std::size_t size = host::elementSize(c.aClass);
-                std::vector<Bits> aBits(n);
-                std::vector<double> positions(c.bitArray ? n : 1, width), values(n);
-                std::vector<std::byte> aBytes(n * size);
+                const auto width =
+                    c.aClass == zqDoubleClass ? 64u : 8 * host::elementSize(c.aClass);
+                std::vector<double> positions(c.bitArray ? n : 1, double(width));
+                std::vector<double> values(c.valueArray ? n : 1, 0);
                 for (unsigned long i = 0; i < n; ++i) {
-                    aBits[i] = (i + 1) * 0x9E3779B97F4A7C15u >> (onDouble ? 32 : 0);
-                    if (onDouble) aBits[i] = std::bit_cast<Bits>(static_cast<double>(aBits[i]));
-                    std::memcpy(aBytes.data() + i * size, &aBits[i], size);
                     if (c.bitArray) positions[i] = static_cast<double>(i % width + 1);
-                    values[i] = static_cast<double>(i % 3);
+                    if (c.valueArray) values[i] = static_cast<double>(i % 3);
                 }
-                values.resize(c.valueArray ? n : 1);
-                const auto a = host::makeArray(c.aClass, {1, n}, aBytes);
-                host::setWantsSharedResult(*a, inPlace);
-                const auto value = arrayOf(c.valueClass, values);
-                const auto outcome = bitset(a, arrayOf(c.bitClass, positions), value);
-                ASSERT_EQ(outcome.error, "");
-                EXPECT_EQ(outcome.result->data == a->data, inPlace);
-                for (unsigned long i = 0; i < n; ++i) {
-                    const auto b = static_cast<unsigned>(positions[c.bitArray ? i : 0]);
-                    const bool set = !value || values[c.valueArray ? i : 0] != 0;
-                    const Bits whole =
-                        onDouble ? static_cast<Bits>(std::bit_cast<double>(aBits[i])) : aBits[i];
-                    const Bits bits = withBit(whole, b, set, width);
-                    const Bits expected =
-                        onDouble ? std::bit_cast<Bits>(static_cast<double>(bits)) : bits;
-                    ASSERT_EQ(bitsAt(outcome.result.get(), i), expected) << "element " << i;
-                }
+                const auto a = flagged(randomOf(c.aClass, n), inPlace);
+                const auto bit = converted(positions, c.bitClass);
+                std::vector<const zqArray_tag*> inputs{a.get(), bit.get()};
+                const auto value =
+                    c.valueClass == noValue ? nullptr : converted(values, c.valueClass);
+                if (value) inputs.push_back(value.get());
+                expectAsModel(inputs);
             }
 }
 
-// The bridge converts BIT and V; neither a refusal after that nor a failed
-// allocation at any step leaves an array behind.
-TEST_F(Bitset, NothingLeftBehind) {
-    const auto a = makeOf<double>({1, 2});
-    const auto value = makeOf<short>({1, 0});
-    const auto bits = makeOf<unsigned char>({1, 2});
-    EXPECT_EQ(bitset(a, makeOf<unsigned char>({1, 65}), value).error,
-              "VESPRA:bitSetGet:BITOutOfRange");
-    for (std::size_t after = 0; after < 4; ++after) {
-        host::failNextAllocations(1, after);
-        const auto outcome = bitset(a, bits, value);
-        host::failNextAllocations(0);
-        EXPECT_EQ(outcome.error.empty(), outcome.result != nullptr) << after;
-    }
+template <class T>
+class EveryClass : public ::testing::Test {};
+TYPED_TEST_SUITE(EveryClass, IntegerTypes);
+
+// Doubles at the edges of T, each bit set and cleared.
+TYPED_TEST(EveryClass, DoubleEdgesAtEveryPosition) {
+    const auto values = makeOf(edgeDoublesOf<TypeParam>()), type = classNameOf<TypeParam>();
+    for (double p = 1; p <= sizeof(TypeParam) * 8; ++p)
+        for (bool v : {false, true})
+            expectAsModel({values.get(), scalarOf(p).get(), scalarOf(double(v)).get(), type.get()});
+}
+
+// The bad position stands last, after every other has been converted.
+TEST(Bitset, RefusedCallWritesNothingIntoFlaggedStorage) {
+    const auto a = flagged(randomOf(zqUInt8Class, 5));
+    expectAsModel({a.get(), makeOf<unsigned char>({1, 2, 3, 4, 9}).get(),
+                   makeOf<short>({1, 0, 1, 0, 1}).get()});
 }
 
 }  // namespace

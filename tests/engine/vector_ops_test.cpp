@@ -1,26 +1,25 @@
-// The parallel driver, the SIMD families as the kernels run them, and the
-// plain records: one serial call below a limit, subranges covering the run
-// exactly once from it, and bit-identical elements either way (in place, on
-// one thread, at odd alignment).
-#include "engine/operator_families.hpp"
-#include "engine/parallel_limits.hpp"
-#include "engine_test_support.hpp"
+// The parallel driver: one serial call on the calling thread below its limit,
+// subranges covering the run exactly once from it; and the plain records,
+// whose elements are the same in one serial call and split down to single
+// elements, with every input broadcast or not.
+#include "engine/vector_ops.hpp"
 
-#include <tbb/global_control.h>
+#include <gtest/gtest.h>
 #include <tbb/task_arena.h>
 
+#include <algorithm>
 #include <memory>
 #include <mutex>
 #include <thread>
 #include <utility>
+#include <vector>
 
-namespace bitfcns::test {
+namespace bitfcns {
 namespace {
 
 using Ranges = std::vector<std::pair<unsigned long, unsigned long>>;
 
-// Runs the driver with a body that records its subranges and whether any ran
-// off the calling thread.
+// The subranges a run was given, and whether any ran off the calling thread.
 struct DriverLog {
     std::mutex mutex;
     Ranges ranges;
@@ -35,167 +34,27 @@ struct DriverLog {
     }
 };
 
-bool coversExactlyOnce(Ranges ranges, unsigned long n) {
-    std::sort(ranges.begin(), ranges.end());
-    unsigned long next = 0;
-    for (const auto& [begin, end] : ranges) {
-        if (begin != next || end <= begin) return false;
-        next = end;
-    }
-    return next == n;
-}
-
 TEST(ParallelDriver, SerialBelowTheLimitSplitFromIt) {
     constexpr unsigned long limit = 5000;
-    {
+    for (unsigned long n : {0ul, limit - 1, limit}) {
         DriverLog log;
-        runInRanges(limit - 1, limit, &DriverLog::body, &log);
-        EXPECT_EQ(log.ranges, (Ranges{{0, limit - 1}}));
-        EXPECT_FALSE(log.offCaller);
-    }
-    {
-        DriverLog log;
-        runInRanges(limit, limit, &DriverLog::body, &log);
-        EXPECT_TRUE(coversExactlyOnce(log.ranges, limit));
-        if (tbb::this_task_arena::max_concurrency() > 1) {
-            EXPECT_GT(log.ranges.size(), 1u);
+        runInRanges(n, limit, &DriverLog::body, &log);
+        if (n < limit) {
+            EXPECT_EQ(log.ranges, (Ranges{{0, n}}));
+            EXPECT_FALSE(log.offCaller);
+            continue;
         }
-    }
-    {
-        DriverLog log;
-        runInRanges(0, limit, &DriverLog::body, &log);
-        EXPECT_EQ(log.ranges, (Ranges{{0, 0}}));
-    }
-}
-
-// Each family as its callers call it, with a plain reference for one
-// element; `values` are the new bit values where the family takes them.
-struct SetOneBitCase {
-    using Family = SetOneBit;
-    template <class T>
-    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
-        SetOneBit::run(out, data, 1, n, p);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return BitorPair::expected(T(std::uint64_t{1} << p), a, p);
-    }
-};
-struct ClearOneBitCase {
-    using Family = ClearOneBit;
-    template <class T>
-    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
-        ClearOneBit::run(out, data, 1, n, p);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return BitandPair::expected(T(~(std::uint64_t{1} << p)), a, p);
-    }
-};
-struct GetOneBitCase {
-    using Family = GetOneBit;
-    template <class T>
-    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
-        GetOneBit::run(out, data, 1, n, p);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return RightShiftAndPair::expected(a, T(1), p);
-    }
-};
-struct SetBitFromValuesCase {
-    using Family = SetBitFromValues;
-    template <class T>
-    static void run(T* out, const T* data, const T* values, unsigned long n, std::uint32_t p) {
-        SetBitFromValues::run(out, data, 1, values, 1, n, p);
-    }
-    template <class T>
-    static T expected(T a, T v, std::uint32_t p) {
-        return BitsetPair::expected(a, v, p);
-    }
-};
-struct LeftShiftCase {
-    using Family = LeftShift;
-    template <class T>
-    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
-        LeftShift::run(out, data, 1, n, p);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return LeftShiftPair::expected(a, p);
-    }
-};
-struct RightShiftCase {
-    using Family = RightShift;
-    template <class T>
-    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t p) {
-        RightShift::run(out, data, 1, n, p);
-    }
-    template <class T>
-    static T expected(T a, T, std::uint32_t p) {
-        return RightShiftPair::expected(a, p);
-    }
-};
-
-// A family's run over n elements that start one element past a register
-// boundary, checked element by element against the reference.
-template <class Case, class T>
-void checkRun(const std::vector<T>& data, const std::vector<T>& values, unsigned long n,
-              bool inPlace) {
-    const std::uint32_t p = bitsOf<T> - 1 - static_cast<std::uint32_t>(n % 3);
-    AlignedBuffer<T> dataBuffer(n + 1), outBuffer(n + 1);
-    T* const dataAt = dataBuffer.data() + 1;
-    std::copy_n(data.begin(), n, dataAt);
-    T* const out = inPlace ? dataAt : outBuffer.data() + 1;
-    Case::run(out, dataAt, values.data(), n, p);
-    unsigned long i = 0;
-    while (i < n && out[i] == Case::expected(data[i], values[i], p)) ++i;
-    ASSERT_EQ(i, n) << "first wrong element of " << n << (inPlace ? ", in place" : "");
-}
-
-// Just below and at the family's limit, in place or not, on all threads and
-// on one.
-template <class Case, class T>
-void checkAroundLimit() {
-    using Record = typename Case::Family::template Record<T>;
-    const unsigned long limit = Record::parallelLimit;
-    const std::vector<T> data = testValues<T>(limit, 5);
-    const std::vector<T> values = newBitValues<T>(limit, 6);
-    for (bool oneThread : {false, true}) {
-        std::unique_ptr<tbb::global_control> control;
-        if (oneThread)
-            control = std::make_unique<tbb::global_control>(
-                tbb::global_control::max_allowed_parallelism, 1);
-        for (bool inPlace : {false, true}) {
-            checkRun<Case>(data, values, limit - 1, inPlace);
-            checkRun<Case>(data, values, limit, inPlace);
+        std::sort(log.ranges.begin(), log.ranges.end());
+        unsigned long next = 0;
+        for (const auto& [begin, end] : log.ranges) {
+            EXPECT_TRUE(begin == next && end > begin) << begin << ".." << end;
+            next = end;
         }
+        EXPECT_EQ(next, n);
+        EXPECT_TRUE(tbb::this_task_arena::max_concurrency() == 1 || log.ranges.size() > 1);
     }
 }
 
-template <class T>
-class EveryWidthFamilies : public ::testing::Test {};
-TYPED_TEST_SUITE(EveryWidthFamilies, AllIntegers);
-
-TYPED_TEST(EveryWidthFamilies, SetOneBit) { checkAroundLimit<SetOneBitCase, TypeParam>(); }
-TYPED_TEST(EveryWidthFamilies, ClearOneBit) { checkAroundLimit<ClearOneBitCase, TypeParam>(); }
-TYPED_TEST(EveryWidthFamilies, GetOneBit) { checkAroundLimit<GetOneBitCase, TypeParam>(); }
-TYPED_TEST(EveryWidthFamilies, LeftShift) { checkAroundLimit<LeftShiftCase, TypeParam>(); }
-
-template <class T>
-class RightShiftFamilies : public ::testing::Test {};
-TYPED_TEST_SUITE(RightShiftFamilies, RightShiftIntegers);
-TYPED_TEST(RightShiftFamilies, RightShift) { checkAroundLimit<RightShiftCase, TypeParam>(); }
-
-template <class T>
-class BitsetFamilies : public ::testing::Test {};
-TYPED_TEST_SUITE(BitsetFamilies, BitsetIntegers);
-TYPED_TEST(BitsetFamilies, SetBitFromValues) {
-    checkAroundLimit<SetBitFromValuesCase, TypeParam>();
-}
-
-// Plain records: the same elements in one serial call and split down to
-// single elements, with every input broadcast or not.
 struct WeightedSum {
     unsigned long operator()(unsigned long a) const { return 3 * a + 1; }
     unsigned long operator()(unsigned long a, short b) const {
@@ -213,40 +72,38 @@ void runWithLimit(const Record& record, unsigned long limit) {
 
 TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
     constexpr unsigned long n = 1001;
-    const std::vector<unsigned long> a = testValues<unsigned long>(n, 7);
-    const std::vector<short> b = testValues<short>(n, 8);
+    std::vector<unsigned long> a(n);
+    std::vector<short> b(n);
     const std::unique_ptr<bool[]> flags(new bool[n]);
-    for (unsigned long i = 0; i < n; ++i) flags[i] = i % 3 == 0;
-
-    for (unsigned long s1 : {0ul, 1ul})
-        for (unsigned long s2 : {0ul, 1ul})
-            for (unsigned long s3 : {0ul, 1ul})
-                for (unsigned long limit : {n + 1, 1ul}) {
-                    SCOPED_TRACE(testing::Message()
-                                 << "strides " << s1 << s2 << s3 << " limit " << limit);
-                    std::vector<unsigned long> one(n), two(n), three(n);
-                    runWithLimit(
-                        bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{
-                            a.data(), one.data(), s1, n, {}},
-                        limit);
-                    runWithLimit(
-                        bitfcnsTwoInputVectorOp<unsigned long, short, WeightedSum>{
-                            a.data(), b.data(), two.data(), s1, s2, n, {}},
-                        limit);
-                    runWithLimit(
-                        bitfcnsThreeInputVectorOp<unsigned long, short, bool, WeightedSum>{
-                            a.data(), b.data(), flags.get(), three.data(), s1, s2, s3, n, {}},
-                        limit);
-                    for (unsigned long i = 0; i < n; ++i) {
-                        const unsigned long x = a[i * s1];
-                        const short y = b[i * s2];
-                        const bool z = flags[i * s3];
-                        ASSERT_EQ(one[i], WeightedSum{}(x)) << i;
-                        ASSERT_EQ(two[i], WeightedSum{}(x, y)) << i;
-                        ASSERT_EQ(three[i], WeightedSum{}(x, y, z)) << i;
-                    }
-                }
+    for (unsigned long i = 0; i < n; ++i) {
+        a[i] = i * 0x9E3779B97F4A7C15u;
+        b[i] = static_cast<short>(i * 40503);
+        flags[i] = i % 3 == 0;
+    }
+    for (unsigned long strides = 0; strides < 8; ++strides)
+        for (unsigned long limit : {n + 1, 1ul}) {
+            const unsigned long s1 = strides & 1, s2 = strides >> 1 & 1, s3 = strides >> 2;
+            SCOPED_TRACE(testing::Message() << "strides " << s1 << s2 << s3 << " limit " << limit);
+            std::vector<unsigned long> one(n), two(n), three(n);
+            runWithLimit(
+                bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{
+                    a.data(), one.data(), s1, n, {}},
+                limit);
+            runWithLimit(
+                bitfcnsTwoInputVectorOp<unsigned long, short, WeightedSum>{
+                    a.data(), b.data(), two.data(), s1, s2, n, {}},
+                limit);
+            runWithLimit(
+                bitfcnsThreeInputVectorOp<unsigned long, short, bool, WeightedSum>{
+                    a.data(), b.data(), flags.get(), three.data(), s1, s2, s3, n, {}},
+                limit);
+            for (unsigned long i = 0; i < n; ++i) {
+                ASSERT_EQ(one[i], WeightedSum{}(a[i * s1])) << i;
+                ASSERT_EQ(two[i], WeightedSum{}(a[i * s1], b[i * s2])) << i;
+                ASSERT_EQ(three[i], WeightedSum{}(a[i * s1], b[i * s2], flags[i * s3])) << i;
+            }
+        }
 }
 
 }  // namespace
-}  // namespace bitfcns::test
+}  // namespace bitfcns

@@ -6,22 +6,21 @@ bitcalc=${1:?usage: command_line_test.sh BITCALC}
 scratch=$(mktemp -d)
 trap 'rm -rf "$scratch"' EXIT
 failures=0
+fail() { echo "FAIL $*"; failures=$((failures + 1)); }
 
 # expect NAME STATUS EXPECTED_STDOUT -- COMMAND...
 expect() {
-  local name=$1 status=$2 expected=$3
+  local name=$1 status=$2 expected=$3 actual code
   shift 4
-  local actual
   actual=$("$@" 2>"$scratch/stderr")
-  local code=$?
-  if [[ $code != "$status" || $actual != "$expected" ]]; then
-    echo "FAIL $name: status $code (wanted $status)"
-    echo "  stdout: $actual"
-    echo "  wanted: $expected"
-    echo "  stderr: $(cat "$scratch/stderr")"
-    failures=$((failures + 1))
-  fi
+  code=$?
+  [[ $code == "$status" && $actual == "$expected" ]] || fail "$name: status $code (wanted $status)
+  stdout: $actual
+  wanted: $expected
+  stderr: $(<"$scratch/stderr")"
 }
+# Lost output and input that can't be read are errors, told on standard error.
+stderr_says() { grep -q -- "$1" "$scratch/stderr" || fail "stderr lacks '$1'"; }
 
 expect "-e canonical" 0 $'x = uint8 1x3 [1 2 255]\nans = double 1x1 [3]' -- \
   "$bitcalc" --canonical -e 'x = uint8([1 2 255]), 1 + 2'
@@ -35,11 +34,6 @@ printf 'y = 2 * 3\n' >"$scratch/statements.m"
 expect "file" 0 'y = double 1x1 [6]' -- "$bitcalc" --canonical "$scratch/statements.m"
 expect "standard input" 0 'y = double 1x1 [6]' -- bash -c "'$bitcalc' --canonical < '$scratch/statements.m'"
 expect "missing file" 1 '' -- "$bitcalc" "$scratch/none.m"
-
-# Lost output and input that can't be read are errors, told on standard error.
-stderr_says() {
-  grep -q -- "$1" "$scratch/stderr" || { echo "FAIL stderr lacks '$1'"; failures=$((failures + 1)); }
-}
 expect "write error" 1 '' -- bash -c "'$bitcalc' --canonical -e 'x = 1:10' >/dev/full"
 stderr_says "can't write the output"
 expect "directory" 1 '' -- "$bitcalc" "$scratch"
@@ -56,15 +50,11 @@ expect "--check reports the line" 1 \
   actual:   x = double 1x1 [5]
 $scratch/failing.case: 1 of 2 cases passed" -- "$bitcalc" --check "$scratch/failing.case"
 
-expect "--help" 0 "$("$bitcalc" --help)" -- "$bitcalc" --help
-grep -q -- '--canonical' <<<"$("$bitcalc" --help)" || { echo "FAIL --help doesn't explain --canonical"; failures=$((failures + 1)); }
+help=$("$bitcalc" --help) && [[ $help == *--canonical* ]] || fail "--help fails or doesn't explain --canonical"
 for usage in "--bogus" "-e" "-e 1 -e 2" "--check" "-e 1 file.m" "a.m b.m"; do
   # shellcheck disable=SC2086
   expect "usage: $usage" 2 '' -- "$bitcalc" $usage
 done
 
-if ((failures)); then
-  echo "$failures command line checks failed"
-  exit 1
-fi
+((failures)) && { echo "$failures command line checks failed"; exit 1; }
 echo "command line checks passed"

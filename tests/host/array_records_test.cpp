@@ -1,6 +1,5 @@
-// Array records: sizes as the host shows them, refused creation, shared
-// copies and references outliving their source, lent elements, alignment of
-// the storage.
+// Array records: refused creation, shared copies and references outliving
+// their source, lent elements, alignment of the storage.
 #include "host/array_factory.hpp"
 #include "host/host_control.hpp"
 #include "tests/support/host_arrays.hpp"
@@ -16,18 +15,6 @@ class ArrayRecordTest : public testing_support::LeakCheckedTest {};
 
 zqArraySlot create(const Dims& dims, zqClassID cls = zqDoubleClass) {
     return zqArraySlot(create_uninitnumeric(dims.size(), dims.data(), cls, zqReal, 0, nullptr));
-}
-
-TEST_F(ArrayRecordTest, SizesAreNormalisedTheWayTheHostShowsThem) {
-    const std::pair<Dims, Dims> givenAndShown[] = {
-        {{}, {1, 1}},     {{3}, {3, 1}},      {{2, 3, 1, 1}, {2, 3}}, {{2, 1, 4, 1}, {2, 1, 4}},
-        {{0, 3}, {0, 3}}, {{1, 1, 1}, {1, 1}}};
-    for (const auto& [given, shown] : givenAndShown) {
-        zqArraySlot array = create(given);
-        ASSERT_TRUE(array);
-        EXPECT_EQ(host::dimensions(*array), shown);
-        EXPECT_EQ((array->flags & zqTwoDimensionalFlag) != 0, shown.size() == 2);
-    }
 }
 
 // Only sizes none of which is 0 can overflow the byte count.
@@ -58,12 +45,6 @@ TEST_F(ArrayRecordTest, SharedCopySurvivesEitherDestructionOrder) {
             EXPECT_EQ(static_cast<const double*>(survivor.data)[n - 1], static_cast<double>(n - 1));
         }
     }
-    // A conversion to the array's own class is one more reference to it.
-    zqArraySlot array = host::makeDoubleScalar(4);
-    boost::intrusive_ptr<zqArray_tag> same = matrix::convert_if_needed(array.get(), zqDoubleClass);
-    EXPECT_EQ(same.get(), array.get());
-    array.reset();
-    EXPECT_EQ(*static_cast<const double*>(same->data), 4.0);
 }
 
 // The lender gets its elements back once, when the last record reading them
@@ -97,11 +78,8 @@ TEST_F(ArrayRecordTest, LentElementsAreReadInPlaceAndGivenBackOnce) {
 
 TEST_F(ArrayRecordTest, DataIsAlignedForEverySize) {
     for (unsigned long n : {1UL, 3UL, 17UL, 4097UL, 100000UL}) {
-        for (zqClassID cls : {zqUInt8Class, zqDoubleClass}) {
-            zqArraySlot array = create({1, n}, cls);
-            ASSERT_TRUE(array);
-            EXPECT_EQ(reinterpret_cast<std::uintptr_t>(array->data) % 16, 0u) << n;
-        }
+        zqArraySlot array = create({1, n}, zqUInt8Class);
+        EXPECT_EQ(reinterpret_cast<std::uintptr_t>(array->data) % 16, 0u) << n;
     }
 }
 

@@ -32,8 +32,6 @@ CASES = [
 
 @pytest.mark.parametrize("name, operands", CASES, ids=[case[0] for case in CASES])
 def test_chunked_results_equal_one_whole_call(name, operands):
-    if name not in bitfcns.available_functions():
-        pytest.skip(f"libbitfcns.so doesn't define {name} yet")
     result = getattr(bd, name)(*operands)
     whole = getattr(bitfcns, name)(*[op.compute() if isinstance(op, da.Array) else op for op in operands])
     assert result.dtype == whole.dtype and result._meta.dtype == whole.dtype
@@ -57,47 +55,17 @@ def test_nothing_is_computed_until_asked():
 
 def test_refusals_of_classes_and_sizes_come_at_once():
     bytes_ = chunked(np.zeros(10, np.uint8), 3)
-    with pytest.raises(BitfcnsError) as raised:
-        bd.bitand(bytes_, chunked(np.zeros(9, np.uint8), 3))
-    assert raised.value.identifier == "VESPRA:Bitand:sizeMismatch"
-    with pytest.raises(BitfcnsError) as raised:
+    with pytest.raises(BitfcnsError, match="mixedClasses"):
         bd.bitand(bytes_, chunked(np.zeros(10), 3))  # a double array isn't a scalar
-    assert raised.value.identifier == "VESPRA:Bitand:mixedClasses"
     # A one-element double array is a scalar partner, in every chunk too.
     np.testing.assert_array_equal(bd.bitand(bytes_, np.ones((1, 1))).compute(), np.zeros((1, 10)))
 
 
-def values_before_counts(a, count):
-    """Stands for a function that tests all values, then all counts."""
-    if np.any(a < 0):
-        raise BitfcnsError("bad value", "VESPRA:bitshift:outOfRange")
-    if np.any(count < 0):
-        raise BitfcnsError("bad count", "VESPRA:bitshift:inputsMustBeIntegers")
-    return a
-
-
 @pytest.mark.parametrize("scheduler", ["sync", "threads"])
-@pytest.mark.parametrize("bad_counts", ["first chunks", "scalar"])
-def test_the_earliest_operand_with_a_fault_decides_whichever_chunk_fails_first(scheduler, bad_counts):
-    values = np.ones(40)
-    values[-1] = -1  # the last chunk has a bad value
-    counts = np.ones(40)
-    counts[:5] = -1
-    count_operand = chunked(counts, 5) if bad_counts == "first chunks" else -1.0
-    lazy = bd._apply(values_before_counts, (chunked(values, 5), count_operand))
-    with pytest.raises(BitfcnsError) as raised:
-        lazy.compute(scheduler=scheduler)
-    assert raised.value.identifier == "VESPRA:bitshift:outOfRange"
-    assert raised.value.message == "bad value"
-
-
-@pytest.mark.needs("bitshift")
-def test_a_bad_value_in_the_last_chunk_wins_over_a_bad_count_in_the_first():
+@pytest.mark.parametrize("counts", [chunked(np.r_[np.nan, np.ones(19)], 4), np.nan], ids=["first chunk", "scalar"])
+def test_a_bad_value_in_the_last_chunk_wins_over_a_bad_count_in_the_first(scheduler, counts):
     values = np.arange(20.0)
     values[-1] = 0.5
-    counts = np.ones(20)
-    counts[0] = np.nan
-    lazy = bd.bitshift(chunked(values, 4), chunked(counts, 4))
     with pytest.raises(BitfcnsError) as raised:
-        lazy.compute()
+        bd.bitshift(chunked(values, 4), counts).compute(scheduler=scheduler)
     assert raised.value.identifier == "VESPRA:bitshift:outOfRange"

@@ -1,4 +1,4 @@
-# The module's own work: operands and their conversions, shapes, storage in
+# The module's own work: operands and their conversions, layouts, storage in
 # both directions, errors, threads, docstrings and stubs.
 import doctest
 import gc
@@ -7,29 +7,19 @@ import pathlib
 import subprocess
 import sys
 import threading
+from concurrent.futures import ThreadPoolExecutor
 
 import numpy as np
 import pytest
 
 import bitfcns
 import bitfcns.dask
-from conftest import INTEGER_DTYPES
 
 
 def identifier_of(call):
     with pytest.raises(bitfcns.BitfcnsError) as raised:
         call()
     return raised.value.identifier
-
-
-# --- operands ----------------------------------------------------------------
-
-
-@pytest.mark.parametrize("dtype", INTEGER_DTYPES)
-def test_integer_dtypes_keep_their_class(dtype):
-    a = np.array([0, 5, 100], dtype)
-    assert bitfcns.bitand(a, a).dtype == dtype
-    np.testing.assert_array_equal(bitfcns.bitcmp(a), np.invert(a))
 
 
 def test_python_scalars_are_doubles_and_logicals():
@@ -41,53 +31,18 @@ def test_python_scalars_are_doubles_and_logicals():
     assert bitfcns.bitand(2**63, 2**63).item() == 2**63
 
 
-@pytest.mark.parametrize("value", [2**53 + 1, -(2**53) - 1, 2**64 + 1, 10**400])
-def test_ints_without_an_exact_double_are_refused(value):
-    with pytest.raises(ValueError, match="no exact double") as raised:
-        bitfcns.bitand(np.uint64(1), value)
-    assert not isinstance(raised.value, bitfcns.BitfcnsError)
-
-
 @pytest.mark.parametrize(
-    "operand, named",
-    [
-        ([1, 2], "list"),
-        (None, "NoneType"),
-        (b"uint8", "bytes"),
-        (np.array([1], np.float16), "float16"),
-        (np.array([1], object), "object"),
-        (np.array(["int8"]), "<U4"),
-        (np.ma.masked_array([1], mask=[True]), "masked array"),
-    ],
+    "operand, raised, message",
+    [(2**53 + 1, ValueError, "no exact double"), (-(2**53) - 1, ValueError, "no exact double"),
+     (10**400, ValueError, "no exact double"), ([1, 2], TypeError, "list"), (b"uint8", TypeError, "bytes"),
+     (np.array([1], np.float16), TypeError, "float16"), (np.array([1], object), TypeError, "object"),
+     (np.ma.masked_array([1], mask=[True]), TypeError, "masked array")],
 )
-def test_other_operands_are_type_errors_naming_them(operand, named):
-    with pytest.raises(TypeError, match=named) as raised:
+def test_operands_without_a_host_class_are_python_errors(operand, raised, message):
+    with pytest.raises(raised, match=message) as caught:
         bitfcns.bitand(np.uint8(1), operand)
-    assert "argument 2" in str(raised.value) and "float64" in str(raised.value)
-
-
-def test_complex_operands_reach_the_library():
-    z = np.array([1 + 2j, 3j])
-    assert identifier_of(lambda: bitfcns.bitand(z, 1.0)) == "VESPRA:Bitand:complexInputs"
-    assert identifier_of(lambda: bitfcns.bitcmp(z.astype(np.complex64))) == "VESPRA:bitcmp:firstArgNotInt"
-    assert identifier_of(lambda: bitfcns.bitcmp(z)) == "VESPRA:bitcmp:complexOperands"
-
-
-# --- shapes and layouts --------------------------------------------------------
-
-
-@pytest.mark.parametrize(
-    "a_shape, b_shape",
-    [((), ()), ((4,), ()), ((), (4,)), ((3, 1), (1, 4)), ((2, 1, 3), (3,)), ((0, 3), (1, 3)),
-     ((1, 1, 5), (5,)), ((2, 3, 4, 1, 2), (4, 2, 2))],
-)
-def test_results_have_numpy_broadcast_shapes(a_shape, b_shape):
-    rng = np.random.default_rng(1)
-    a = rng.integers(0, 256, a_shape, dtype=np.uint8)
-    b = rng.integers(0, 256, b_shape, dtype=np.uint8)
-    result = bitfcns.bitor(a, b)
-    assert result.shape == np.broadcast_shapes(a_shape, b_shape)
-    np.testing.assert_array_equal(result, a | b)
+    assert not isinstance(caught.value, bitfcns.BitfcnsError)
+    assert raised is ValueError or ("argument 2" in str(caught.value) and "float64" in str(caught.value))
 
 
 def layouts(base):
@@ -114,9 +69,6 @@ def test_every_layout_gives_the_c_ordered_result(layout):
     np.testing.assert_array_equal(bitfcns.bitcmp(operand), ~base)
 
 
-# --- storage both ways ---------------------------------------------------------
-
-
 def test_overwrite_input_takes_over_a_writeable_c_ordered_operand_only():
     fresh = lambda: np.arange(12, dtype=np.uint16).reshape(3, 4)  # noqa: E731
     a = fresh()
@@ -137,7 +89,6 @@ def test_overwrite_input_takes_over_a_writeable_c_ordered_operand_only():
         np.testing.assert_array_equal(result, ~original)
 
 
-@pytest.mark.needs("bitshift")
 def test_an_operand_reading_the_first_shifted_keeps_it_from_being_taken_over():
     values = np.arange(40001, dtype=np.int32) % 7  # beyond the parallel limits
     expected = values[:-1] << values[1:]
@@ -166,10 +117,7 @@ def test_results_and_operands_outlive_each_other():
     np.testing.assert_array_equal(view, ~np.arange(10, 20))
 
 
-# --- errors --------------------------------------------------------------------
-
-
-def test_refusal_carries_identifier_and_catalogue_sentence():
+def test_refusals_carry_identifier_and_sentence_and_bad_calls_are_type_errors():
     with pytest.raises(bitfcns.BitfcnsError) as raised:
         bitfcns.bitcmp(np.array([1.5]))
     error = raised.value
@@ -177,20 +125,11 @@ def test_refusal_carries_identifier_and_catalogue_sentence():
     assert error.identifier == "VESPRA:bitcmp:outOfRange"
     assert error.message == "The input to bitcmp must hold integers that the assumed integer class can hold."
     assert str(error) == f"{error.message} (VESPRA:bitcmp:outOfRange)"
-    assert identifier_of(lambda: bitfcns.bitand(1.0, 2.0, "int7")) == "VESPRA:Bitand:unknownTypeString"
     assert identifier_of(lambda: bitfcns.bitxor(np.uint8(1), 1.0, "uint16")) == "VESPRA:bitxor:invalidTypeString"
-
-
-def test_a_non_ascii_type_name_is_a_refusal_without_identifier():
-    assert identifier_of(lambda: bitfcns.bitcmp(5.0, "int1\u00e9")) is None
-    assert identifier_of(lambda: bitfcns.bitcmp(5.0, "\U0001f600")) is None
-
-
-def test_argument_counts_and_keywords_are_type_errors():
+    assert identifier_of(lambda: bitfcns.bitand(np.array([1 + 2j]), 1.0)) == "VESPRA:Bitand:complexInputs"
+    assert identifier_of(lambda: bitfcns.bitcmp(5.0, "\U0001f600")) is None  # the host's, without one
     with pytest.raises(TypeError, match=r"bitcmp\(\) takes 1 to 2 positional arguments but 3 were given"):
         bitfcns.bitcmp(1.0, "uint8", "uint8")
-    with pytest.raises(TypeError, match="2 to 3 positional arguments but 0 were given"):
-        bitfcns.bitand()
     with pytest.raises(TypeError, match="unexpected keyword argument 'overwrite'"):
         bitfcns.bitand(1.0, 1.0, overwrite=True)
 
@@ -201,56 +140,28 @@ def test_allocation_failure_is_a_memory_error():
         bitfcns.bitand(column, column.T)  # 2**48 bytes
 
 
-def test_missing_functions_raise_not_implemented():
-    missing = set(bitfcns.__all__[2:]) - set(bitfcns.available_functions())
-    if not missing:
-        pytest.skip("the library defines all seven functions")
-    for name in missing:
-        with pytest.raises(NotImplementedError, match=name):
-            getattr(bitfcns, name)(np.uint8(1), 1)
-
-
-# --- threads -------------------------------------------------------------------
-
-
 def test_calls_from_many_threads_at_once():
     rng = np.random.default_rng(7)
     work = [rng.integers(0, 2**63, 50000, dtype=np.uint64) for _ in range(8)]
-    failures = []
 
     def run(values):
-        for shift in range(30):
-            if not np.array_equal(bitfcns.bitxor(values, values[::-1]), values ^ values[::-1]):
-                failures.append("bitxor")
-            if identifier_of(lambda: bitfcns.bitand(-1.0, values.astype(float))) != "VESPRA:Bitand:outOfRange":
-                failures.append("refusal")
+        for _ in range(30):
+            assert np.array_equal(bitfcns.bitxor(values, values[::-1]), values ^ values[::-1])
+            assert identifier_of(lambda: bitfcns.bitand(-1.0, values.astype(float))) == "VESPRA:Bitand:outOfRange"
 
-    threads = [threading.Thread(target=run, args=(values,)) for values in work]
-    for thread in threads:
-        thread.start()
-    for thread in threads:
-        thread.join()
-    assert not failures
+    with ThreadPoolExecutor(len(work)) as pool:
+        list(pool.map(run, work))  # raises what a thread raised
 
 
 def test_the_gil_is_released_while_the_library_runs():
-    # With no forced switches, another thread runs during the calls only if
-    # the calls let go of the GIL.
-    doubles = np.arange(1e6)
-    started, done = threading.Event(), threading.Event()
-
-    def work():
-        started.set()
-        for _ in range(20):
-            bitfcns.bitcmp(doubles)
-        done.set()
-
+    # With no forced switches, this thread counts turns during the calls only
+    # if the calls let go of the GIL.
+    done = threading.Event()
+    worker = threading.Thread(target=lambda: ([bitfcns.bitcmp(np.arange(1e6)) for _ in range(20)], done.set()))
     interval = sys.getswitchinterval()
     sys.setswitchinterval(100)
     try:
-        worker = threading.Thread(target=work)
         worker.start()
-        started.wait()
         turns = 0
         while not done.wait(0.001):
             turns += 1
@@ -260,20 +171,11 @@ def test_the_gil_is_released_while_the_library_runs():
     assert turns > 0
 
 
-# --- documentation -------------------------------------------------------------
+DOCUMENTED = [bitfcns.BitfcnsError, bitfcns.available_functions] + [
+    getattr(module, name) for name in bitfcns.__all__[2:] for module in (bitfcns, bitfcns.dask)]
 
 
-def documented_objects():
-    available = set(bitfcns.available_functions())
-    yield bitfcns.BitfcnsError
-    yield bitfcns.available_functions
-    for name in bitfcns.__all__[2:]:
-        if name in available:
-            yield getattr(bitfcns, name)
-            yield getattr(bitfcns.dask, name)
-
-
-@pytest.mark.parametrize("documented", list(documented_objects()), ids=lambda o: f"{o.__module__}.{o.__name__}")
+@pytest.mark.parametrize("documented", DOCUMENTED, ids=lambda o: f"{o.__module__}.{o.__name__}")
 def test_docstring_examples(documented):
     finder = doctest.DocTestFinder(recurse=False)
     runner = doctest.DocTestRunner(optionflags=doctest.ELLIPSIS | doctest.NORMALIZE_WHITESPACE)

@@ -1,6 +1,6 @@
-// Terse makers and readers of host arrays for tests, a fixture that fails a
-// test which leaves array records alive, and a caller of the exported entry
-// points that reports the identifier of a refusal.
+// Terse makers and readers of host arrays for tests, a caller of the exported
+// entry points that reports the identifier of a refusal, and a fixture that
+// fails a test which leaves array records alive.
 #pragma once
 
 #include "host/array_factory.hpp"
@@ -11,7 +11,6 @@
 #include <gtest/gtest.h>
 
 #include <exception>
-#include <initializer_list>
 #include <span>
 #include <string>
 #include <vector>
@@ -29,17 +28,7 @@ inline constexpr zqClassID classIdOf = host::elementClassOf<T>;
 template <class T>
 zqArraySlot makeOf(const std::vector<T>& values, host::Dims dims = {}) {
     if (dims.empty()) dims = {1, values.size()};
-    if constexpr (std::is_same_v<T, bool>) {
-        std::vector<unsigned char> bytes(values.begin(), values.end());
-        return host::makeArray(classIdOf<T>, dims, std::span<const unsigned char>(bytes));
-    } else {
-        return host::makeArray(classIdOf<T>, dims, std::span<const T>(values));
-    }
-}
-
-template <class T>
-zqArraySlot makeOf(std::initializer_list<T> values, host::Dims dims = {}) {
-    return makeOf(std::vector<T>(values), std::move(dims));
+    return host::makeArray(classIdOf<T>, dims, std::span<const T>(values));
 }
 
 template <class T>
@@ -54,6 +43,23 @@ std::vector<T> elementsOf(const zqArray_tag* array) {
     return std::vector<T>(data, data + host::elementCount(*array));
 }
 
+using EntryPoint = void (*)(int, zqArraySlot*, int, const zqArray_tag**);
+
+// The identifier of the refusal (the what() text of an error without one),
+// or "" with the result in `result`.
+inline std::string callEntry(EntryPoint entry, std::vector<const zqArray_tag*> inputs,
+                             zqArraySlot* result = nullptr) {
+    zqArraySlot own;
+    try {
+        entry(1, result ? result : &own, static_cast<int>(inputs.size()), inputs.data());
+    } catch (const foundation::core::except::IMsgIDException& error) {
+        return error.GetID();
+    } catch (const std::exception& error) {
+        return error.what();
+    }
+    return "";
+}
+
 class LeakCheckedTest : public ::testing::Test {
 protected:
     void TearDown() override {
@@ -63,27 +69,5 @@ protected:
 private:
     std::size_t liveAtStart_ = host::liveArrayCount();
 };
-
-using EntryPoint = void (*)(int, zqArraySlot*, int, const zqArray_tag**);
-
-// The outcome of one call: the result, or the refusal's identifier (the
-// what() text for an error without one).
-struct CallOutcome {
-    zqArraySlot result;
-    std::string error;
-};
-
-inline CallOutcome callEntry(EntryPoint entry, std::vector<const zqArray_tag*> inputs,
-                             int nlhs = 1) {
-    CallOutcome outcome;
-    try {
-        entry(nlhs, &outcome.result, static_cast<int>(inputs.size()), inputs.data());
-    } catch (const foundation::core::except::IMsgIDException& error) {
-        outcome.error = error.GetID();
-    } catch (const std::exception& error) {
-        outcome.error = error.what();
-    }
-    return outcome;
-}
 
 }  // namespace testing_support
