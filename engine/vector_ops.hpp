@@ -11,7 +11,7 @@
 #pragma once
 
 #include "engine/parallel_driver.hpp"
-#include "engine/prefetch.hpp"
+#include "engine/plain_loops.hpp"
 #include "engine/simd_loops.hpp"
 
 #include <tbb/blocked_range.h>
@@ -34,10 +34,8 @@ struct bitfcnsOneInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i) {
-            prefetchAhead(in + i * stride);
-            out[i] = ftor(in[i * stride]);
-        }
+        plain_detail::runElements(out, range.begin(), range.end(), ftor,
+                                  plain_detail::Input<In>{in, stride});
     }
 };
 
@@ -55,11 +53,9 @@ struct bitfcnsTwoInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i) {
-            prefetchAhead(in1 + i * stride1);
-            prefetchAhead(in2 + i * stride2);
-            out[i] = ftor(in1[i * stride1], in2[i * stride2]);
-        }
+        plain_detail::runElements(out, range.begin(), range.end(), ftor,
+                                  plain_detail::Input<In1>{in1, stride1},
+                                  plain_detail::Input<In2>{in2, stride2});
     }
 };
 
@@ -79,12 +75,9 @@ struct bitfcnsThreeInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i) {
-            prefetchAhead(in1 + i * stride1);
-            prefetchAhead(in2 + i * stride2);
-            prefetchAhead(in3 + i * stride3);
-            out[i] = ftor(in1[i * stride1], in2[i * stride2], in3[i * stride3]);
-        }
+        plain_detail::runElements(
+            out, range.begin(), range.end(), ftor, plain_detail::Input<In1>{in1, stride1},
+            plain_detail::Input<In2>{in2, stride2}, plain_detail::Input<In3>{in3, stride3});
     }
 };
 
