@@ -1,6 +1,6 @@
 // Helpers of the engine tests: the element type lists, 16-byte aligned
 // buffers with sentinels around the data, deterministic test data that
-// includes each type's extremes, and the six functor pairs with plain scalar
+// includes each type's extremes, and the seven functor pairs with plain scalar
 // references, written in 64-bit arithmetic independently of the twins.
 #pragma once
 
@@ -100,7 +100,7 @@ std::uint64_t bitPattern(T x) {
     return static_cast<std::uint64_t>(static_cast<std::make_unsigned_t<T>>(x));
 }
 
-// The six pairs: how to build the two functors from a run's parameter (shift
+// The seven pairs: how to build the two functors from a run's parameter (shift
 // count or bit index), a plain scalar reference, and the second operand the
 // pair is used with.
 struct BitandPair {
@@ -188,6 +188,20 @@ struct LeftShiftPair {
     template <class T>
     static T expected(T a, std::uint32_t count) {
         return T(bitPattern(a) << count);
+    }
+};
+struct ComplementPair {
+    template <class T>
+    static auto vector(std::uint32_t) {
+        return IntComplementSSE2Ftor{};
+    }
+    template <class T>
+    static auto scalar(std::uint32_t) {
+        return IntComplementFtor<T>{};
+    }
+    template <class T>
+    static T expected(T a, std::uint32_t) {
+        return T(~bitPattern(a));
     }
 };
 struct RightShiftPair {

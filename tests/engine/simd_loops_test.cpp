@@ -1,8 +1,10 @@
-// The six SIMD functor pairs through unarySIMDApply and binarySIMDApply,
-// against plain scalar references: every run length from 0 to 3L + 1, every
+// The seven SIMD functor pairs through unarySIMDApply and binarySIMDApply,
+// against plain scalar references: every run length from 0 to 5L + 1 (a
+// head, a whole cache line of registers and some left over), every
 // start offset of output and contiguous inputs within a register (so also
 // operands that can never be aligned together), broadcast, contiguous and
-// wider-strided inputs, and an output that is the first input.
+// wider-strided inputs, an output that is the first input, with ordinary
+// and with streaming stores.
 #include "engine/simd_loops.hpp"
 #include "engine_test_support.hpp"
 
@@ -39,10 +41,13 @@ std::string layout(std::size_t n, std::size_t outOffset, std::size_t offset1, un
            " parameter=" + std::to_string(parameter) + (inPlace ? " in place" : "");
 }
 
+constexpr ResultStores bothStores[] = {ResultStores::cached, ResultStores::streamed};
+
 template <class Pair, class T>
-void sweepBinary() {
+void sweepBinary(ResultStores stores) {
+    SCOPED_TRACE(stores == ResultStores::streamed ? "streaming stores" : "ordinary stores");
     constexpr std::size_t lanes = lanesOf<T>;
-    constexpr std::size_t longest = 3 * lanes + 1;
+    constexpr std::size_t longest = 5 * lanes + 1;
     constexpr std::size_t room = 2 * longest + lanes;
     const std::vector<T> first = testValues<T>(longest, 1);
     const std::vector<T> second = Pair::template secondValues<T>(longest);
@@ -62,7 +67,7 @@ void sweepBinary() {
                                 const T* b = place(in2, second, offset2, stride2, n);
                                 binarySIMDApply(out.data() + outOffset, a, b, 1, stride1, stride2,
                                                 n, Pair::template vector<T>(parameter),
-                                                Pair::template scalar<T>(parameter));
+                                                Pair::template scalar<T>(parameter), stores);
                                 const T* result = out.data() + outOffset;
                                 for (std::size_t i = 0; i < n; ++i)
                                     ASSERT_EQ(
@@ -79,9 +84,10 @@ void sweepBinary() {
 }
 
 template <class Pair, class T>
-void sweepUnary() {
+void sweepUnary(ResultStores stores) {
+    SCOPED_TRACE(stores == ResultStores::streamed ? "streaming stores" : "ordinary stores");
     constexpr std::size_t lanes = lanesOf<T>;
-    constexpr std::size_t longest = 3 * lanes + 1;
+    constexpr std::size_t longest = 5 * lanes + 1;
     constexpr std::size_t room = 2 * longest + lanes;
     const std::vector<T> values = testValues<T>(longest, 3);
     AlignedBuffer<T> out(room), in(room);
@@ -97,7 +103,7 @@ void sweepUnary() {
                         const T* a = place(inPlace ? out : in, values, offset, stride, n);
                         unarySIMDApply(out.data() + outOffset, a, 1, stride, n,
                                        Pair::template vector<T>(parameter),
-                                       Pair::template scalar<T>(parameter));
+                                       Pair::template scalar<T>(parameter), stores);
                         const T* result = out.data() + outOffset;
                         for (std::size_t i = 0; i < n; ++i)
                             ASSERT_EQ(result[i],
@@ -113,22 +119,37 @@ template <class T>
 class EveryWidthPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryWidthPairs, AllIntegers);
 
-TYPED_TEST(EveryWidthPairs, Bitand) { sweepBinary<BitandPair, TypeParam>(); }
-TYPED_TEST(EveryWidthPairs, Bitor) { sweepBinary<BitorPair, TypeParam>(); }
-TYPED_TEST(EveryWidthPairs, RightShiftAnd) { sweepBinary<RightShiftAndPair, TypeParam>(); }
-TYPED_TEST(EveryWidthPairs, LeftShift) { sweepUnary<LeftShiftPair, TypeParam>(); }
+TYPED_TEST(EveryWidthPairs, Bitand) {
+    for (ResultStores stores : bothStores) sweepBinary<BitandPair, TypeParam>(stores);
+}
+TYPED_TEST(EveryWidthPairs, Bitor) {
+    for (ResultStores stores : bothStores) sweepBinary<BitorPair, TypeParam>(stores);
+}
+TYPED_TEST(EveryWidthPairs, RightShiftAnd) {
+    for (ResultStores stores : bothStores) sweepBinary<RightShiftAndPair, TypeParam>(stores);
+}
+TYPED_TEST(EveryWidthPairs, LeftShift) {
+    for (ResultStores stores : bothStores) sweepUnary<LeftShiftPair, TypeParam>(stores);
+}
+TYPED_TEST(EveryWidthPairs, Complement) {
+    for (ResultStores stores : bothStores) sweepUnary<ComplementPair, TypeParam>(stores);
+}
 
 template <class T>
 class RightShiftPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(RightShiftPairs, RightShiftIntegers);
 
-TYPED_TEST(RightShiftPairs, RightShift) { sweepUnary<RightShiftPair, TypeParam>(); }
+TYPED_TEST(RightShiftPairs, RightShift) {
+    for (ResultStores stores : bothStores) sweepUnary<RightShiftPair, TypeParam>(stores);
+}
 
 template <class T>
 class BitsetPairs : public ::testing::Test {};
 TYPED_TEST_SUITE(BitsetPairs, BitsetIntegers);
 
-TYPED_TEST(BitsetPairs, Bitset) { sweepBinary<BitsetPair, TypeParam>(); }
+TYPED_TEST(BitsetPairs, Bitset) {
+    for (ResultStores stores : bothStores) sweepBinary<BitsetPair, TypeParam>(stores);
+}
 
 // The twin of bitset also serves value types other than T: a value is true
 // when it isn't zero in its own type.

@@ -125,6 +125,17 @@ struct LeftShiftCase {
         return LeftShiftPair::expected(a, p);
     }
 };
+struct ComplementCase {
+    using Family = Complement;
+    template <class T>
+    static void run(T* out, const T* data, const T*, unsigned long n, std::uint32_t) {
+        Complement::run(out, data, 1, n);
+    }
+    template <class T>
+    static T expected(T a, T, std::uint32_t p) {
+        return ComplementPair::expected(a, p);
+    }
+};
 struct RightShiftCase {
     using Family = RightShift;
     template <class T>
@@ -181,6 +192,7 @@ TYPED_TEST(EveryWidthFamilies, SetOneBit) { checkAroundLimit<SetOneBitCase, Type
 TYPED_TEST(EveryWidthFamilies, ClearOneBit) { checkAroundLimit<ClearOneBitCase, TypeParam>(); }
 TYPED_TEST(EveryWidthFamilies, GetOneBit) { checkAroundLimit<GetOneBitCase, TypeParam>(); }
 TYPED_TEST(EveryWidthFamilies, LeftShift) { checkAroundLimit<LeftShiftCase, TypeParam>(); }
+TYPED_TEST(EveryWidthFamilies, Complement) { checkAroundLimit<ComplementCase, TypeParam>(); }
 
 template <class T>
 class RightShiftFamilies : public ::testing::Test {};
@@ -192,6 +204,38 @@ class BitsetFamilies : public ::testing::Test {};
 TYPED_TEST_SUITE(BitsetFamilies, BitsetIntegers);
 TYPED_TEST(BitsetFamilies, SetBitFromValues) {
     checkAroundLimit<SetBitFromValuesCase, TypeParam>();
+}
+
+// A result large enough for streaming stores, at an odd element, split over
+// the threads; and the same run in place, which keeps ordinary stores.
+TEST(StreamedResults, AgreeWithTheReference) {
+    using T = unsigned short;
+    const unsigned long n = streamingResultBytes / sizeof(T) + 77;
+    const std::vector<T> data = testValues<T>(n, 9);
+    const std::vector<T> values = newBitValues<T>(n, 10);
+    for (bool inPlace : {false, true}) {
+        checkRun<SetBitFromValuesCase>(data, values, n, inPlace);
+        checkRun<RightShiftCase>(data, values, n, inPlace);
+    }
+}
+
+// Which results stream: large ones that overlap no input.
+TEST(StreamedResults, OnlyLargeResultsClearOfEveryInput) {
+    using record_detail::resultStoresFor;
+    using record_detail::spanOf;
+    constexpr unsigned long large = streamingResultBytes;
+    const std::unique_ptr<unsigned char[]> memory(new unsigned char[2 * large + 1]);
+    unsigned char* const out = memory.get();
+    unsigned char* const apart = out + large;  // starts where the result ends
+    const unsigned char one = 1;
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(apart, 1, large), spanOf(&one, 0, large)}),
+              ResultStores::streamed);
+    EXPECT_EQ(resultStoresFor(out, large - 1, {spanOf(apart, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(out, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(apart - 1, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(apart, large, {spanOf(out + 1, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(apart, 1, large), spanOf(out + 9, 0, large)}),
+              ResultStores::cached);
 }
 
 // Plain records: the same elements in one serial call and split down to
