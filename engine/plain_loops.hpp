@@ -62,7 +62,8 @@ void elementLoop(Out* out, unsigned long begin, unsigned long end, Ftor ftor,
 template <class Out, class Ftor, class... T>
 void runElements(Out* out, unsigned long begin, unsigned long end, Ftor ftor,
                  Input<T>... inputs) noexcept {
-    if (((inputs.stride == 1) && ...))
+    const bool allContiguous = (true && ... && (inputs.stride == 1));
+    if (allContiguous)
         elementLoop(out, begin, end, ftor, ContiguousInput<T>{inputs.p, {}}...);
     else
         elementLoop(out, begin, end, ftor, inputs...);
