@@ -3,13 +3,10 @@
 // simply shifts everything out.
 #pragma once
 
-#include "engine/prefetch.hpp"
+#include "frame/element_scan.hpp"
 #include "frame/floating.hpp"
 
 #include <emmintrin.h>
-
-#include <algorithm>
-#include <cstdint>
 
 namespace bitfcns {
 
@@ -22,18 +19,13 @@ inline bool allWholeCounts(const float* counts, unsigned long n) noexcept {
 }
 
 // The same for doubles, two lanes at a time and without a branch per
-// element; the stop comes at the end of the failing element's block. A
+// element (the stop comes at the end of the failing element's block). A
 // magnitude below 2^52 is whole exactly when adding and subtracting 2^52
 // gives it back, as the sum lies where doubles are one apart; from 2^52 up
 // every finite double is whole, which capping the magnitude at 2^52 keeps.
 // NaN and the infinities pass that part (the cap replaces them) and fail the
 // finiteness compare.
 inline bool allWholeCounts(const double* counts, unsigned long n) noexcept {
-    if (n != 0 && reinterpret_cast<std::uintptr_t>(counts) % 16 != 0) {
-        if (!isWholeNumber(*counts)) return false;
-        ++counts;
-        --n;
-    }
     const __m128d twoTo52 = _mm_set1_pd(4503599627370496.0);
     const __m128d signBit = _mm_set1_pd(-0.0);
     const __m128d largest = _mm_set1_pd(largestFiniteDouble);
@@ -44,21 +36,7 @@ inline bool allWholeCounts(const double* counts, unsigned long n) noexcept {
             _mm_cmpeq_pd(_mm_sub_pd(_mm_add_pd(capped, twoTo52), twoTo52), capped);
         return _mm_and_pd(whole, _mm_cmple_pd(magnitude, largest));
     };
-    constexpr unsigned long blockElements = 1024;
-    const unsigned long even = n - n % 4;
-    for (unsigned long block = 0; block < even; block += blockElements) {
-        const unsigned long end = std::min(even, block + blockElements);
-        __m128d pass0 = _mm_castsi128_pd(_mm_set1_epi32(-1)), pass1 = pass0;
-        for (unsigned long i = block; i < end; i += 4) {
-            prefetchAhead(counts + i);
-            pass0 = _mm_and_pd(pass0, wholeLanes(_mm_load_pd(counts + i)));
-            pass1 = _mm_and_pd(pass1, wholeLanes(_mm_load_pd(counts + i + 2)));
-        }
-        if (_mm_movemask_pd(_mm_and_pd(pass0, pass1)) != 3) return false;
-    }
-    for (unsigned long i = even; i < n; ++i)
-        if (!isWholeNumber(counts[i])) return false;
-    return true;
+    return allLanesPass(counts, n, wholeLanes, [](double x) { return isWholeNumber(x); });
 }
 
 }  // namespace bitfcns

@@ -8,19 +8,61 @@
 // Every record knows its parallel limit from its functor: a plain functor
 // names it as `parallelLimit`, a vector functor as `parallelLimit<T>`. So a
 // record runs with the limit of its own family and no other.
+//
+// A SIMD record writes a large result that overlaps none of its inputs (a
+// result the host has just allocated) with streaming stores, and any other
+// with ordinary ones; it tells the two apart from the addresses alone, so
+// no caller has to say which it passes.
 #pragma once
 
 #include "engine/parallel_driver.hpp"
-#include "engine/prefetch.hpp"
+#include "engine/plain_loops.hpp"
 #include "engine/simd_loops.hpp"
 
 #include <tbb/blocked_range.h>
 
+#include <cstdint>
+#include <initializer_list>
 #include <type_traits>
 
 namespace bitfcns {
 
 using VectorRange = tbb::blocked_range<unsigned long>;
+
+// Results of this many bytes and more go through streaming stores when no
+// input overlaps them. With its inputs such a result fills the last-level
+// cache of the machines this library runs on (32 MiB) or more, so ordinary
+// stores would only read every line of it in before overwriting it, and
+// evict the inputs' lines to make room.
+inline constexpr unsigned long streamingResultBytes = 16ul << 20;
+
+namespace record_detail {
+
+// The bytes [first, last) that an operand of n elements spans with its
+// stride: a broadcast takes one element.
+struct ByteSpan {
+    std::uintptr_t first;
+    std::uintptr_t last;
+};
+template <class T>
+ByteSpan spanOf(const T* p, unsigned long stride, unsigned long n) noexcept {
+    const auto first = reinterpret_cast<std::uintptr_t>(p);
+    return {first, first + ((n - 1) * stride + 1) * sizeof(T)};
+}
+
+// Streaming stores for a result of n elements of T at `out` when it is
+// large and overlaps none of `inputs`, ordinary stores otherwise.
+template <class T>
+ResultStores resultStoresFor(const T* out, unsigned long n,
+                             std::initializer_list<ByteSpan> inputs) noexcept {
+    if (n < streamingResultBytes / sizeof(T)) return ResultStores::cached;
+    const ByteSpan result = spanOf(out, 1, n);
+    for (const ByteSpan& input : inputs)
+        if (input.first < result.last && result.first < input.last) return ResultStores::cached;
+    return ResultStores::streamed;
+}
+
+}  // namespace record_detail
 
 // out[i] = ftor(in[i * stride]).
 template <class In, class Ftor>
@@ -34,10 +76,8 @@ struct bitfcnsOneInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i) {
-            prefetchAhead(in + i * stride);
-            out[i] = ftor(in[i * stride]);
-        }
+        plain_detail::runElements(out, range.begin(), range.end(), ftor,
+                                  plain_detail::Input<In>{in, stride});
     }
 };
 
@@ -55,11 +95,9 @@ struct bitfcnsTwoInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i) {
-            prefetchAhead(in1 + i * stride1);
-            prefetchAhead(in2 + i * stride2);
-            out[i] = ftor(in1[i * stride1], in2[i * stride2]);
-        }
+        plain_detail::runElements(out, range.begin(), range.end(), ftor,
+                                  plain_detail::Input<In1>{in1, stride1},
+                                  plain_detail::Input<In2>{in2, stride2});
     }
 };
 
@@ -79,12 +117,9 @@ struct bitfcnsThreeInputVectorOp {
     Ftor ftor;
 
     void operator()(const VectorRange& range) const noexcept {
-        for (unsigned long i = range.begin(); i != range.end(); ++i) {
-            prefetchAhead(in1 + i * stride1);
-            prefetchAhead(in2 + i * stride2);
-            prefetchAhead(in3 + i * stride3);
-            out[i] = ftor(in1[i * stride1], in2[i * stride2], in3[i * stride3]);
-        }
+        plain_detail::runElements(
+            out, range.begin(), range.end(), ftor, plain_detail::Input<In1>{in1, stride1},
+            plain_detail::Input<In2>{in2, stride2}, plain_detail::Input<In3>{in3, stride3});
     }
 };
 
@@ -102,8 +137,10 @@ struct bitfcnsUnarySIMDVectorOp {
     ScalarFtor scalarFtor;
 
     void operator()(const VectorRange& range) const noexcept {
+        const ResultStores stores =
+            record_detail::resultStoresFor(out, n, {record_detail::spanOf(in, stride, n)});
         unarySIMDApply(out + range.begin(), in + range.begin() * stride, 1, stride, range.size(),
-                       simdFtor, scalarFtor);
+                       simdFtor, scalarFtor, stores);
     }
 };
 
@@ -123,9 +160,12 @@ struct bitfcnsBinarySIMDVectorOp {
     ScalarFtor scalarFtor;
 
     void operator()(const VectorRange& range) const noexcept {
+        const ResultStores stores = record_detail::resultStoresFor(
+            out, n,
+            {record_detail::spanOf(in1, stride1, n), record_detail::spanOf(in2, stride2, n)});
         binarySIMDApply(out + range.begin(), in1 + range.begin() * stride1,
                         in2 + range.begin() * stride2, 1, stride1, stride2, range.size(), simdFtor,
-                        scalarFtor);
+                        scalarFtor, stores);
     }
 };
 

@@ -42,19 +42,19 @@ struct LaneTest {
 
 }  // namespace scan_detail
 
-// True when each of the n doubles is a whole number that T holds: the
-// element test of fitsInteger<T>, two lanes at a time. The answer is that of
-// testing the elements in order and stopping at the first failure; the stop
-// comes at the end of the failing element's block.
-template <class T>
-bool allFitInteger(const double* data, unsigned long n) noexcept {
-    // The first element alone when it isn't on a register boundary.
+// True when every one of the n doubles passes: `lanes` tests two at a time
+// (all ones in a lane that passes), `element` one, for the first element
+// when it isn't on a register boundary and for the last odd ones. The
+// answer is that of testing the elements in order and stopping at the first
+// failure; the stop comes at the end of the failing element's block.
+template <class LaneTest, class ElementTest>
+bool allLanesPass(const double* data, unsigned long n, const LaneTest& lanes,
+                  ElementTest element) noexcept {
     if (n != 0 && reinterpret_cast<std::uintptr_t>(data) % 16 != 0) {
-        if (!fitsInteger<T>(*data)) return false;
+        if (!element(*data)) return false;
         ++data;
         --n;
     }
-    const scan_detail::LaneTest<T> test;
     constexpr unsigned long blockElements = 1024;
     const unsigned long even = n - n % 4;
     for (unsigned long block = 0; block < even; block += blockElements) {
@@ -64,14 +64,22 @@ bool allFitInteger(const double* data, unsigned long n) noexcept {
             // The hardware prefetchers don't keep one core's loads ahead of
             // memory here; ask for the data 2 KiB ahead.
             __builtin_prefetch(data + i + 256);
-            pass0 = _mm_and_pd(pass0, test(_mm_load_pd(data + i)));
-            pass1 = _mm_and_pd(pass1, test(_mm_load_pd(data + i + 2)));
+            pass0 = _mm_and_pd(pass0, lanes(_mm_load_pd(data + i)));
+            pass1 = _mm_and_pd(pass1, lanes(_mm_load_pd(data + i + 2)));
         }
         if (_mm_movemask_pd(_mm_and_pd(pass0, pass1)) != 3) return false;
     }
     for (unsigned long i = even; i < n; ++i)
-        if (!fitsInteger<T>(data[i])) return false;
+        if (!element(data[i])) return false;
     return true;
+}
+
+// True when each of the n doubles is a whole number that T holds: the
+// element test of fitsInteger<T>, two lanes at a time.
+template <class T>
+bool allFitInteger(const double* data, unsigned long n) noexcept {
+    return allLanesPass(data, n, scan_detail::LaneTest<T>{},
+                        [](double x) { return fitsInteger<T>(x); });
 }
 
 }  // namespace bitfcns

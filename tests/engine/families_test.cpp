@@ -1,9 +1,11 @@
 // Each SIMD operator family as its callers run it, against a plain model in
 // 64-bit arithmetic: every length up to three registers and a lane, at every
 // placement of output and operands within a register, broadcast or
-// contiguous, in place or not, with nothing written outside the result; and
-// runs one below and at the family's parallel limit, on all threads and on one.
+// contiguous, in place or not, with nothing written outside the result; runs
+// one below and at the family's parallel limit, on all threads and on one;
+// and results large enough to be written with streaming stores.
 #include "engine/operator_families.hpp"
+#include "engine/vector_ops.hpp"
 
 #include <gtest/gtest.h>
 #include <tbb/global_control.h>
@@ -68,6 +70,10 @@ void forEachFamily(auto check) {
         [](O o, P p) { GetOneBit::run(o.out, o.data, o.dataStride, o.n, p); },
         [](T a, T, P p) { return T(bitsOf(a) >> p & 1); });
     check(
+        "Complement", Complement::Record<T>::parallelLimit, false,
+        [](O o, P) { Complement::run(o.out, o.data, o.dataStride, o.n); },
+        [](T a, T, P) { return T(~bitsOf(a)); });
+    check(
         "LeftShift", LeftShift::Record<T>::parallelLimit, false,
         [](O o, P p) { LeftShift::run(o.out, o.data, o.dataStride, o.n, p); },
         [](T a, T, P p) { return T(bitsOf(a) << p); });
@@ -96,13 +102,13 @@ using Integers = ::testing::Types<signed char, unsigned char, short, unsigned sh
                                   unsigned int, long, unsigned long>;
 TYPED_TEST_SUITE(Families, Integers);
 
-// Every length up to three registers and a lane (the scalar twin alone, then
-// head, body and tail); the output and each contiguous operand at every
+// Every length up to five registers and a lane (the scalar twin alone, then
+// head, a cache line of registers a step, and tail); the output and each contiguous operand at every
 // element offset within a register, so also operands that are never aligned
 // together; each operand broadcast or contiguous; in place or not.
 TYPED_TEST(Families, ShortRunsAtEveryPlacementMatchTheModel) {
     using T = TypeParam;
-    constexpr unsigned long lanes = lanesOf<T>, longest = 3 * lanes + 1, room = longest + lanes;
+    constexpr unsigned long lanes = lanesOf<T>, longest = 5 * lanes + 1, room = longest + lanes;
     const T sentinel = static_cast<T>(0xA5A5A5A5A5A5A5A5u);
     const std::vector<T> data = testValues<T>(longest, 1), values = testValues<T>(longest, 2);
     forEachFamily<T>([&](const char* name, unsigned long, bool takesValues, auto run, auto model) {
@@ -164,6 +170,44 @@ TYPED_TEST(Families, RunsAroundTheParallelLimitMatchTheModel) {
                 }
         }
     });
+}
+
+// A result past the streaming size at an odd element, split over the
+// threads, fresh (streamed) and in place (ordinary stores).
+TEST(StreamedResults, MatchTheModel) {
+    using T = unsigned short;
+    const unsigned long n = streamingResultBytes / sizeof(T) + 77;
+    const std::vector<T> data = testValues<T>(n + 1, 9), values = testValues<T>(n + 1, 10);
+    std::vector<T> in(n + 1), out(n + 1);
+    forEachFamily<T>([&](const char* name, unsigned long, bool, auto run, auto model) {
+        for (bool inPlace : {false, true}) {
+            std::copy(data.begin(), data.end(), in.begin());
+            T* const o = (inPlace ? in : out).data() + 1;
+            run(Operands<T>{o, in.data() + 1, 1, values.data() + 1, 1, n}, 7);
+            unsigned long i = 0;
+            while (i < n && o[i] == model(data[i + 1], values[i + 1], 7)) ++i;
+            ASSERT_EQ(i, n) << name << ": first wrong element" << (inPlace ? ", in place" : "");
+        }
+    });
+}
+
+// Which results stream: large ones that overlap no input.
+TEST(StreamedResults, OnlyLargeResultsClearOfEveryInput) {
+    using record_detail::resultStoresFor;
+    using record_detail::spanOf;
+    constexpr unsigned long large = streamingResultBytes;
+    const std::unique_ptr<unsigned char[]> memory(new unsigned char[2 * large + 1]);
+    unsigned char* const out = memory.get();
+    unsigned char* const apart = out + large;  // starts where the result ends
+    const unsigned char one = 1;
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(apart, 1, large), spanOf(&one, 0, large)}),
+              ResultStores::streamed);
+    EXPECT_EQ(resultStoresFor(out, large - 1, {spanOf(apart, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(out, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(apart - 1, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(apart, large, {spanOf(out + 1, 1, large)}), ResultStores::cached);
+    EXPECT_EQ(resultStoresFor(out, large, {spanOf(apart, 1, large), spanOf(out + 9, 0, large)}),
+              ResultStores::cached);
 }
 
 }  // namespace
