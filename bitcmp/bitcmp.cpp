@@ -1,12 +1,14 @@
-// bitcmp: the entry point, the integer path (the engine's Complement family) and
-// the double path (validation of the assumed class, then BitcmpFtor<T>).
+// bitcmp: the entry point, the integer path (the engine's Complement family)
+// and the double path (the complement of each element taken for the assumed
+// class, tested in the same pass).
 #include "bitcmp/bitcmp_ftor.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "engine/operator_families.hpp"
+#include "engine/parallel_driver.hpp"
 #include "frame/array.hpp"
 #include "frame/assumed_type.hpp"
+#include "frame/checked_lanes.hpp"
 #include "frame/class_types.hpp"
-#include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
 #include "frame/message_tags.hpp"
 
@@ -43,16 +45,14 @@ void bitcmpIntegerOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** 
     plhs[0] = std::move(result);
 }
 
-// Every element is tested before any is written, so a refused call leaves
-// an operand whose storage the result shares untouched.
+// In place every element is tested before any is written, so a refused call
+// leaves the operand whose storage the result shares untouched; a fresh
+// result is tested and written in one pass, and a refusal destroys it.
 template <class T>
 void bitcmpDoubleDriver(const zqArray_tag* operand, zqArray_tag* result) {
-    const unsigned long n = numberOfElements(result);
-    if (n == 0) return;
-    const double* in = dataOf<double>(operand);
-    if (!allFitInteger<T>(in, n)) raiseError<errors::outOfRange>();
-    runVectorOp(
-        bitfcnsOneInputVectorOp<double, BitcmpFtor<T>>{in, dataOf<double>(result), 1, n, {}});
+    if (!runCheckedLanes(BitcmpLanes<T>{}, dataOf<double>(operand), nullptr, dataOf<double>(result),
+                         numberOfElements(result), &runInRanges))
+        raiseError<errors::outOfRange>();
 }
 
 void bitcmpDoubleOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** prhs) {

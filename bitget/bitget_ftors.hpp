@@ -1,11 +1,14 @@
 // The element functions of bitget: BitgetFtor<T> for double values taken for
-// integers of class T, and bitgetVVFtor<T, U> for integer values of class T
-// with an array of positions of class U. A position p names bit p - 1, the
-// least significant bit being position 1.
+// integers of class T (BitgetLanes<T> two at a time with one position), and
+// bitgetVVFtor<T, U> for integer values of class T with an array of
+// positions of class U. A position p names bit p - 1, the least significant
+// bit being position 1.
 #pragma once
 
 #include "engine/parallel_limits.hpp"
 #include "engine/simd_functors.hpp"
+#include "frame/double_lanes.hpp"
+#include "frame/element_scan.hpp"
 #include "frame/integer_conversion.hpp"
 
 #include <cstdint>
@@ -37,6 +40,30 @@ struct BitgetFtor {
     double operator()(double x, double p) const noexcept {
         const T index = wholeDoubleTo<T>(p - 1.0);
         return static_cast<double>(bitOf(wholeDoubleTo<T>(x), static_cast<std::uint64_t>(index)));
+    }
+};
+
+// BitgetFtor<T> with one position for every element, as a lane kernel of
+// the double path's checked loop: the values' patterns in T shifted right
+// by the bit index, the low bit as 0.0 or 1.0.
+template <class T>
+struct BitgetLanes {
+    static constexpr int arity = 1;
+    static constexpr unsigned long parallelLimit = limits::bitgetOnDouble;
+
+    scan_detail::LaneTest<T> fits;
+    __m128i bitIndex;  // in the low 64 bits, below T's width
+
+    explicit BitgetLanes(unsigned index) noexcept
+        : bitIndex(_mm_cvtsi32_si128(static_cast<int>(index))) {}
+
+    __m128d check(__m128d x) const noexcept { return fits(x); }
+
+    __m128d apply(__m128d x) const noexcept {
+        const __m128i bit =
+            _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
+        return _mm_and_pd(_mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit)),
+                          lanes::broadcast(1.0));
     }
 };
 

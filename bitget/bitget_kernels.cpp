@@ -6,8 +6,10 @@
 
 #include "bitget/bitget_ftors.hpp"
 #include "engine/operator_families.hpp"
+#include "engine/parallel_driver.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/array.hpp"
+#include "frame/checked_lanes.hpp"
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
@@ -69,6 +71,16 @@ void bitgetFloatingPositions(T* out, const T* in, const U* positions, unsigned l
     }
 }
 
+// An array of values with one valid position: tested and computed by the
+// checked loop. False when some value is refused, the refusal then left to
+// the caller's tests; a fresh result is partly written by then.
+template <class T>
+bool getBitsAtOnePosition(const double* x, double p, double* out, unsigned long n) {
+    if (!bitIsValid(p, bitWidth<T>)) return false;
+    const BitgetLanes<T> kernel(static_cast<unsigned>(static_cast<int>(p) - 1));
+    return runCheckedLanes(kernel, x, nullptr, out, n, &runInRanges);
+}
+
 }  // namespace
 
 template <class T>
@@ -77,6 +89,7 @@ void bitgetDoubleDriver(const zqArray_tag* values, const zqArray_tag* positions,
     const unsigned long n = numberOfElements(result);
     const double* x = dataOf<double>(values);
     const double* p = dataOf<double>(positions);
+    if (positionsScalar && getBitsAtOnePosition<T>(x, *p, dataOf<double>(result), n)) return;
     // All values before any position, so a bad value hides a bad position.
     if (valuesScalar || n != 0) {
         if (!allFitInteger<T>(x, valuesScalar ? 1 : n)) raiseError<VESPRA::bitget::outOfRange>();

@@ -7,9 +7,11 @@
 
 namespace bitfcns {
 
-// The double path for values taken for integers of class T: tests every value,
-// then every position, then writes bit p - 1 of each value into `result` as
-// 0.0 or 1.0. A scalar operand is read for every element of the result.
+// The double path for values taken for integers of class T: writes bit p - 1
+// of each value into `result` as 0.0 or 1.0, and refuses a bad value before a
+// bad position. In place nothing is written before every value and position
+// has passed; a fresh result with one position is tested and written in one
+// pass. A scalar operand is read for every element of the result.
 template <class T>
 void bitgetDoubleDriver(const zqArray_tag* values, const zqArray_tag* positions,
                         zqArray_tag* result, bool valuesScalar, bool positionsScalar);

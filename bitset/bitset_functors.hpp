@@ -1,7 +1,8 @@
 // The element arithmetic of bitset: the position and mask that one valid
 // BIT element gives, the truth of one V element, the functors of the integer
 // path (bitsetVVVFtor, bitsetVVTFtor, bitsetVVFFtor) and BitsetFtor<T>, which
-// works on doubles taken for integers of class T.
+// works on doubles taken for integers of class T (BitsetLanes<T, set> two at
+// a time with one position and one V).
 //
 // Everything works on the stored bit pattern of T: the sign bit of a signed
 // T is an ordinary bit, and nothing saturates. BIT elements reach a functor
@@ -10,6 +11,8 @@
 #pragma once
 
 #include "engine/parallel_limits.hpp"
+#include "frame/double_lanes.hpp"
+#include "frame/element_scan.hpp"
 #include "frame/integer_conversion.hpp"
 
 #include <cstdint>
@@ -93,6 +96,38 @@ struct BitsetFtor {
 
     double operator()(double a, double b, bool v) const noexcept {
         return integerToDouble(withMask(wholeDoubleTo<T>(a), maskAt<T>(bitIndexOf(b)), v));
+    }
+};
+
+// BitsetFtor<T> with one position and one V for every element, as a lane
+// kernel of the double path's checked loop. Setting bit i where it is clear
+// adds its weight to x, clearing it where it is set subtracts it; the weight
+// is 2^i, or -2^i for the sign bit of a signed T. x plus a whole number is
+// the exact value rounded once, as integerToDouble rounds it. Where nothing
+// changes, x + 0.0 turns -0.0 into the 0.0 that the integer route gives.
+template <class T, bool set>
+struct BitsetLanes {
+    static constexpr int arity = 1;
+    static constexpr unsigned long parallelLimit = limits::bitsetOnDouble;
+
+    scan_detail::LaneTest<T> fits;
+    __m128i bitIndex;  // in the low 64 bits
+    __m128d change;    // the weight to add (set) or to subtract (clear)
+
+    explicit BitsetLanes(std::uint32_t index) noexcept
+        : bitIndex(_mm_cvtsi32_si128(static_cast<int>(index))),
+          change(lanes::broadcast((std::is_signed_v<T> && index == sizeof(T) * 8 - 1) == set
+                                      ? -std::ldexp(1.0, static_cast<int>(index))
+                                      : std::ldexp(1.0, static_cast<int>(index)))) {}
+
+    __m128d check(__m128d x) const noexcept { return fits(x); }
+
+    __m128d apply(__m128d x) const noexcept {
+        const __m128i bit =
+            _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
+        const __m128d isSet = _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit));
+        const __m128d addend = set ? _mm_andnot_pd(isSet, change) : _mm_and_pd(isSet, change);
+        return _mm_add_pd(x, addend);
     }
 };
 

@@ -6,9 +6,11 @@
 #include "bitset/bitset_functors.hpp"
 #include "bitset/bitset_paths.hpp"
 #include "bitset/result_shape.hpp"
+#include "engine/parallel_driver.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/array.hpp"
 #include "frame/assumed_type.hpp"
+#include "frame/checked_lanes.hpp"
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
@@ -20,17 +22,34 @@ namespace {
 
 using errors = VESPRA::bitset;
 
+// A with one valid position set or cleared as one V says, in the checked
+// loop. False when some element of A is refused (or the position is), the
+// refusal then left to the caller's tests; a fresh result is partly written
+// by then.
+template <class T>
+bool setAtOnePosition(const double* values, double position, bool value, double* out,
+                      unsigned long n) {
+    if (!bitIsValid(position, bitWidth<T>)) return false;
+    const std::uint32_t index = bitIndexOf(position);
+    if (value)
+        return runCheckedLanes(BitsetLanes<T, true>(index), values, nullptr, out, n, &runInRanges);
+    return runCheckedLanes(BitsetLanes<T, false>(index), values, nullptr, out, n, &runInRanges);
+}
+
 // Validates all of A, then all of BIT, for class T, and fills the result,
 // which exists already. A scalar operand is validated even when the result
-// is empty. Nothing is written before both have passed, so a refusal leaves
-// A untouched when the result shares its storage. V needs no test: it is
-// logical.
+// is empty. In place nothing is written before both have passed, so a
+// refusal leaves A untouched; a fresh result with one position and one V is
+// tested and written in one pass. V needs no test: it is logical.
 template <class T>
 void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool* valueData,
                         zqArray_tag* result, bool scalarA, bool scalarBit, bool scalarValue) {
     const unsigned long n = numberOfElements(result);
     const double* values = dataOf<double>(a);
     const double* positions = dataOf<double>(bit);
+    if (scalarBit && scalarValue &&
+        setAtOnePosition<T>(values, *positions, *valueData, dataOf<double>(result), n))
+        return;
     if (!allFitInteger<T>(values, scalarA ? 1 : n)) raiseError<errors::outOfRange>();
     checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>);
     runVectorOp(

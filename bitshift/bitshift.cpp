@@ -6,13 +6,17 @@
 #include "bitshift/class_dispatch.hpp"
 #include "bitshift/count_validation.hpp"
 #include "bitshift/shift_rule.hpp"
+#include "engine/parallel_driver.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/array.hpp"
 #include "frame/assumed_type.hpp"
+#include "frame/checked_lanes.hpp"
 #include "frame/class_types.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/exception.hpp"
 #include "frame/message_tags.hpp"
+
+#include <cmath>
 
 namespace bitfcns {
 namespace {
@@ -58,16 +62,34 @@ struct Operands {
     }
 };
 
+// Values shifted by one whole count in the checked loop. False when some
+// value is refused, the refusal then left to the caller's tests; a fresh
+// result is partly written by then.
+template <class T>
+bool shiftByOneCount(const double* values, double count, double* out, unsigned long n) {
+    if (!isWholeNumber(count)) return false;
+    const auto run = [&](auto kernel) {
+        return runCheckedLanes(kernel, values, nullptr, out, n, &runInRanges);
+    };
+    constexpr double width = bitWidth<T>;
+    if (!(std::fabs(count) < width)) return run(BitshiftLanes<T, DoubleShift::out>(count));
+    if (count > 0) return run(BitshiftLanes<T, DoubleShift::left>(count));
+    return run(BitshiftLanes<T, DoubleShift::right>(count));
+}
+
 // Validates the values for class T and the counts, then shifts into
-// `result`. Every element is tested before any is written, so a refused call
-// leaves values whose storage the result shares untouched. A scalar operand
-// is tested even when the other is empty.
+// `result`, refusing a bad value before a bad count. In place every element
+// is tested before any is written, so a refused call leaves values whose
+// storage the result shares untouched; a fresh result by one count is
+// tested and written in one pass. A scalar operand is tested even when the
+// other is empty.
 template <class T>
 void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, zqArray_tag* result,
                           bool firstIsScalar, bool secondIsScalar) {
     const unsigned long n = numberOfElements(result);
     const double* values = dataOf<const double>(first);
     const double* counts = dataOf<const double>(second);
+    if (secondIsScalar && shiftByOneCount<T>(values, *counts, dataOf<double>(result), n)) return;
     if (!allFitInteger<T>(values, firstIsScalar ? 1 : n)) raiseError<errors::outOfRange>();
     if (!allWholeCounts(counts, secondIsScalar ? 1 : n)) raiseError<errors::inputsMustBeIntegers>();
     if (n == 0) return;

@@ -1,6 +1,7 @@
 // The shift rule of bitshift as element functors: BitshiftFtor<T> for doubles
-// taken for integers of class T, bitshiftVVFtor<T, U> for an integer value
-// and a count of any numeric class. A positive count shifts left, a negative
+// taken for integers of class T (BitshiftLanes<T, kind> two at a time by one
+// count), bitshiftVVFtor<T, U> for an integer value and a count of any
+// numeric class. A positive count shifts left, a negative
 // one right; counts at or beyond the width are answered without a shift, so
 // no shift by the width or more is ever made.
 #pragma once
@@ -8,6 +9,8 @@
 #include "engine/parallel_limits.hpp"
 #include "engine/simd_functors.hpp"
 #include "frame/class_types.hpp"
+#include "frame/double_lanes.hpp"
+#include "frame/element_scan.hpp"
 #include "frame/integer_conversion.hpp"
 
 #include <cmath>
@@ -89,6 +92,47 @@ struct BitshiftFtor {
         const int k = static_cast<int>(c);
         const T value = wholeDoubleTo<T>(x);
         return integerToDouble(k > 0 ? shiftLeftWithin(value, k) : shiftRightWithin(value, -k));
+    }
+};
+
+// What one count does to every double: shift left within the width, shift
+// right, or shift everything out (a count at or beyond the width).
+enum class DoubleShift { left, right, out };
+
+// BitshiftFtor<T> by one whole count, as a lane kernel of the double path's
+// checked loop. Left: the pattern in T shifted, read back as T. Right: the
+// floor of x / 2^k, which is the shift of either kind of T and a double
+// already. Out: -1 for a negative x shifted right, 0 otherwise (the fill is
+// the pattern of -1.0 for a negative count).
+template <class T, DoubleShift kind>
+struct BitshiftLanes {
+    static constexpr int arity = 1;
+    static constexpr unsigned long parallelLimit = limits::bitshiftOnDouble;
+
+    scan_detail::LaneTest<T> fits;
+    __m128i leftCount;   // in the low 64 bits
+    __m128d rightScale;  // 2^-k
+    __m128d fill;        // -1.0 or 0.0, kept where x is negative
+
+    // `count` as the shift rule takes it: k > 0 shifts left, k <= 0 right by
+    // -k; for `out` any count at or beyond the width.
+    explicit BitshiftLanes(double count) noexcept
+        : leftCount(_mm_cvtsi32_si128(kind == DoubleShift::left ? static_cast<int>(count) : 0)),
+          rightScale(lanes::broadcast(
+              kind == DoubleShift::right ? std::ldexp(1.0, static_cast<int>(count)) : 1.0)),
+          fill(lanes::broadcast(count < 0 ? -1.0 : 0.0)) {}
+
+    __m128d check(__m128d x) const noexcept { return fits(x); }
+
+    __m128d apply(__m128d x) const noexcept {
+        if constexpr (kind == DoubleShift::left) {
+            return lanes::fromPattern<T>(_mm_sll_epi64(lanes::patternOf<T>(x), leftCount));
+        } else if constexpr (kind == DoubleShift::right) {
+            const __m128d scaled = _mm_mul_pd(x, rightScale);
+            return sizeof(T) == 8 ? lanes::floorFinite(scaled) : lanes::floorBelow2To51(scaled);
+        } else {
+            return _mm_and_pd(_mm_cmplt_pd(x, _mm_setzero_pd()), fill);
+        }
     }
 };
 

@@ -25,6 +25,16 @@ TEST(Bitcmp, SerialAndParallelRunsFreshAndInPlace) {
     }
 }
 
+template <class T>
+class EveryClass : public ::testing::Test {};
+TYPED_TEST_SUITE(EveryClass, IntegerTypes);
+
+TYPED_TEST(EveryClass, DoubleEdgesFreshAndInPlace) {
+    for (bool inPlace : {false, true})
+        expectAsModel({flagged(makeOf(edgeDoublesOf<TypeParam>()), inPlace).get(),
+                       classNameOf<TypeParam>().get()});
+}
+
 // Every element is tested before any is written: the bad one stands last.
 TEST(Bitcmp, RefusedCallWritesNothingIntoSharedStorage) {
     expectAsModel(

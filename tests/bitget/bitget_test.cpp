@@ -47,6 +47,13 @@ TYPED_TEST(IntegerValues, SerialAndParallelRunsFreshAndInPlace) {
     }
 }
 
+// Doubles at the edges of T, at every position.
+TYPED_TEST(IntegerValues, DoubleEdgesAtEveryPosition) {
+    const auto values = makeOf(edgeDoublesOf<TypeParam>()), type = classNameOf<TypeParam>();
+    for (double p = 1; p <= sizeof(TypeParam) * 8; ++p)
+        expectAsModel({values.get(), scalarOf(p).get(), type.get()});
+}
+
 TEST(DoubleValues, SerialAndParallelRunsFreshAndInPlace) {
     const auto int16 = host::makeCharArray(u"int16");
     for (unsigned long n : {limits::bitgetOnDouble - 1, limits::bitgetOnDouble}) {

@@ -78,6 +78,18 @@ TEST(Bitset, SerialAndParallelRunsAgreeAtEveryLimit) {
             }
 }
 
+template <class T>
+class EveryClass : public ::testing::Test {};
+TYPED_TEST_SUITE(EveryClass, IntegerTypes);
+
+// Doubles at the edges of T, each bit set and cleared.
+TYPED_TEST(EveryClass, DoubleEdgesAtEveryPosition) {
+    const auto values = makeOf(edgeDoublesOf<TypeParam>()), type = classNameOf<TypeParam>();
+    for (double p = 1; p <= sizeof(TypeParam) * 8; ++p)
+        for (bool v : {false, true})
+            expectAsModel({values.get(), scalarOf(p).get(), scalarOf(double(v)).get(), type.get()});
+}
+
 // The bad position stands last, after every other has been converted.
 TEST(Bitset, RefusedCallWritesNothingIntoFlaggedStorage) {
     const auto a = flagged(randomOf(zqUInt8Class, 5));

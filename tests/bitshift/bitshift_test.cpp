@@ -51,6 +51,14 @@ TYPED_TEST(EveryValueClass, SerialAndParallelRunsFreshAndInPlace) {
     }
 }
 
+// Doubles at the edges of T by every count within the width and one beyond.
+TYPED_TEST(EveryValueClass, DoubleEdgesByEveryCount) {
+    constexpr double width = sizeof(TypeParam) * 8;
+    const auto values = makeOf(edgeDoublesOf<TypeParam>()), type = classNameOf<TypeParam>();
+    for (double c = -width - 1; c <= width + 1; ++c)
+        expectAsModel({values.get(), scalarOf(c).get(), type.get()});
+}
+
 TEST(DoubleValues, SerialAndParallelRunsFreshAndInPlace) {
     const auto int16 = host::makeCharArray(u"int16");
     for (unsigned long n : {limits::bitshiftOnDouble - 1, limits::bitshiftOnDouble}) {

@@ -284,15 +284,17 @@ private:
         outcome_.sharesFirst = shares_;
     }
 
-    // The host's helper: AND, OR or XOR under implicit expansion.
-    Operand combine(const Operand& a, const Operand& b, char op, zqClassID cls) {
+    // The host's helper: AND, OR or XOR under implicit expansion; `allocates`
+    // false for the library's own loop into a result it has made already.
+    Operand combine(const Operand& a, const Operand& b, char op, zqClassID cls,
+                    bool allocates = true) {
         const Dims sa = shapeOf(a), sb = shapeOf(b);
         Dims dims(std::max(sa.size(), sb.size()));
         const auto sizeIn = [](const Dims& s, std::size_t d) { return d < s.size() ? s[d] : 1; };
         for (std::size_t d = 0; d < dims.size(); ++d) {
             dims[d] = sizeIn(sa, d) == 1 ? sizeIn(sb, d) : sizeIn(sa, d);
         }
-        allocate(countOf(dims) * elementSize(cls));
+        if (allocates) allocate(countOf(dims) * elementSize(cls));
         Operand r = fresh(cls, dims);
         const auto valueAt = [](const Operand& x, std::size_t i) {
             return x.cls == zqDoubleClass ? exact(realAt(x, i)) : integerAt(x, i);
@@ -359,6 +361,19 @@ private:
         }
         const zqClassID work = in_.size() == 3 ? parseType(in_[2]) : zqUInt64Class;
         if (!work) fail("unknownTypeString");
+        // Two doubles of the same sizes, or one of them scalar: the double
+        // result is made before any element is tested and filled as they
+        // pass; a refused element leaves the report to the conversions.
+        if (ca == zqDoubleClass && cb == zqDoubleClass &&
+            (isScalar(a) || isScalar(b) || sa == sb)) {
+            allocate(countOf(isScalar(a) ? sb : sa) * elementSize(zqDoubleClass));
+            if (allFit(a, work) && allFit(b, work)) {
+                const Operand bits = combine(a, b, op, work, false);
+                Operand r = fresh(zqDoubleClass, bits.dims);
+                for (std::size_t i = 0; i < countOf(r); ++i) putDouble(r, i, realAt(bits, i));
+                return finish(std::move(r));
+            }
+        }
         const auto convert = [&](const Operand& x) -> const Operand& {
             if (x.cls == zqDoubleClass && !allFit(x, work)) fail("outOfRange");
             return converted(x, work);

@@ -1,5 +1,6 @@
 // A call through an exported entry point checked against the reference model
-// on the same operands.
+// on the same operands, and doubles at the edges of an integer class for the
+// double paths.
 #pragma once
 
 #include "host/host_control.hpp"
@@ -7,6 +8,9 @@
 #include "tests/support/host_arrays.hpp"
 
 #include <algorithm>
+#include <cmath>
+#include <cstdint>
+#include <type_traits>
 #include <vector>
 
 namespace testing_support {
@@ -61,6 +65,32 @@ inline void expectModelOutcome(reference::Function function, EntryPoint entry,
             << "the first wrong element (the count when none is)";
     }();
     EXPECT_EQ(host::liveArrayCount(), liveBefore) << "array records leaked";
+}
+
+// Whole doubles of T: the bounds (the largest doubles below 2^63 and 2^64),
+// zeros, the middle, and values of every length and sign.
+template <class T>
+std::vector<double> edgeDoublesOf() {
+    constexpr int bits = sizeof(T) * 8 - std::is_signed_v<T>;
+    const double top = std::ldexp(1.0, bits), low = std::is_signed_v<T> ? -top : 0.0;
+    const double step = bits > 53 ? std::ldexp(1.0, bits - 53) : 1.0;
+    std::vector<double> v{0.0, -0.0, 1.0, low, top - step, top - 2 * step, top / 2, top / 2 + 1};
+    if (low < 0) v.insert(v.end(), {-1.0, low / 2, low / 2 - 1});
+    for (std::uint64_t s = bits, i = 0; i < 40; ++i) {
+        s = s * 6364136223846793005u + 1442695040888963407u;
+        const double m =
+            std::floor(std::ldexp(double(s >> 11) / 9007199254740992.0, int(s % bits)));
+        v.push_back(low < 0 && (s & 1024) ? -m : m);
+    }
+    return v;
+}
+
+// T's class name, the assumed type of a double path.
+template <class T>
+zqArraySlot classNameOf() {
+    constexpr const char16_t* names[] = {u"int8",  u"uint8",  u"int16", u"uint16",
+                                         u"int32", u"uint32", u"int64", u"uint64"};
+    return host::makeCharArray(names[classIdOf<T> - zqInt8Class]);
 }
 
 }  // namespace testing_support

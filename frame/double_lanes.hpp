@@ -1,0 +1,110 @@
+// SSE2 arithmetic on two doubles at a time that hold whole numbers of an
+// integer class T: their two's complement bit patterns, floors, and doubles
+// made back from patterns of T. Exact to the last bit; a 64-bit pattern goes
+// back to the nearest double (ties to even), as integerToDouble does.
+//
+// Lanes that hold no whole number of T (refused by the caller's test) give
+// meaningless bits and never undefined behaviour: everything here is
+// floating arithmetic and bit operations on registers.
+#pragma once
+
+#include <emmintrin.h>
+
+#include <cstdint>
+#include <type_traits>
+
+namespace bitfcns::lanes {
+
+inline __m128d broadcast(double x) noexcept { return _mm_set1_pd(x); }
+inline __m128i broadcast64(std::uint64_t bits) noexcept {
+    return _mm_set1_epi64x(static_cast<long long>(bits));
+}
+
+// 1.5 * 2^52. A whole number x of magnitude below 2^51 plus this lands where
+// doubles are one apart, and the low 32 bits of the sum's pattern are the
+// low 32 bits of x's two's complement.
+inline constexpr double lowWordMagic = 6755399441055744.0;
+inline constexpr double twoTo32 = 4294967296.0;
+inline constexpr double twoToMinus32 = 1.0 / 4294967296.0;
+inline constexpr double twoTo52 = 4503599627370496.0;
+
+// The low 32 bits of each lane's two's complement, in the low half of its
+// 64-bit lane (the high half holds exponent bits). Whole lanes below 2^51
+// in magnitude.
+inline __m128i lowWord(__m128d x) noexcept {
+    return _mm_castpd_si128(_mm_add_pd(x, broadcast(lowWordMagic)));
+}
+
+// The floor of each lane of magnitude below 2^51: rounded to a whole number
+// by the magic sum, then one less where that went up.
+inline __m128d floorBelow2To51(__m128d y) noexcept {
+    const __m128d magic = broadcast(lowWordMagic);
+    const __m128d rounded = _mm_sub_pd(_mm_add_pd(y, magic), magic);
+    return _mm_sub_pd(rounded, _mm_and_pd(_mm_cmpgt_pd(rounded, y), broadcast(1.0)));
+}
+
+// The floor of each finite lane. Below 2^52 in magnitude the sum with 2^52
+// of the lane's sign lands where doubles are one apart; from 2^52 up a
+// double is whole already.
+inline __m128d floorFinite(__m128d y) noexcept {
+    const __m128d signBit = broadcast(-0.0);
+    const __m128d magic = _mm_or_pd(_mm_and_pd(signBit, y), broadcast(twoTo52));
+    const __m128d rounded = _mm_sub_pd(_mm_add_pd(y, magic), magic);
+    const __m128d floor = _mm_sub_pd(rounded, _mm_and_pd(_mm_cmpgt_pd(rounded, y), broadcast(1.0)));
+    const __m128d small = _mm_cmplt_pd(_mm_andnot_pd(signBit, y), broadcast(twoTo52));
+    return _mm_or_pd(_mm_and_pd(small, floor), _mm_andnot_pd(small, y));
+}
+
+// The 64-bit two's complement pattern of each lane, a whole number from
+// -2^63 to below 2^64: the floor of x / 2^32 gives the high word, and
+// x less that many 2^32 (exact: a whole number from 0 to below 2^32) the
+// low one.
+inline __m128i pattern64(__m128d x) noexcept {
+    const __m128d high = floorBelow2To51(_mm_mul_pd(x, broadcast(twoToMinus32)));
+    const __m128d low = _mm_sub_pd(x, _mm_mul_pd(high, broadcast(twoTo32)));
+    return _mm_or_si128(_mm_slli_epi64(lowWord(high), 32),
+                        _mm_and_si128(lowWord(low), broadcast64(0xFFFFFFFFu)));
+}
+
+// The pattern of each lane in T: all 64 bits for the 64-bit classes, the
+// low 32 bits (enough for any narrower T) otherwise.
+template <class T>
+__m128i patternOf(__m128d x) noexcept {
+    if constexpr (sizeof(T) == 8) {
+        return pattern64(x);
+    } else {
+        return lowWord(x);
+    }
+}
+
+// The value of T whose pattern is in the low bits of each 64-bit lane, as a
+// double. Up to 32 bits: T's bits, offset by 2^(width - 1) when T is signed,
+// under the exponent of 2^52, less 2^52 and the offset (exact). For 64 bits:
+// the high word scaled by 2^32 under the exponent of 2^84 and the low word
+// under that of 2^52, so that one addition rounds the sum once.
+template <class T>
+__m128d fromPattern(__m128i v) noexcept {
+    constexpr std::uint64_t exponent52 = 0x4330000000000000u;
+    if constexpr (sizeof(T) < 8) {
+        constexpr int width = static_cast<int>(sizeof(T) * 8);
+        constexpr std::uint64_t mask = (std::uint64_t{1} << width) - 1;
+        constexpr std::uint64_t offset = std::is_signed_v<T> ? std::uint64_t{1} << (width - 1) : 0;
+        const __m128i biased =
+            _mm_xor_si128(_mm_and_si128(v, broadcast64(mask)), broadcast64(exponent52 | offset));
+        return _mm_sub_pd(_mm_castsi128_pd(biased),
+                          broadcast(twoTo52 + static_cast<double>(offset)));
+    } else {
+        constexpr std::uint64_t exponent84 = 0x4530000000000000u;
+        constexpr std::uint64_t highOffset = std::is_signed_v<T> ? 0x80000000u : 0;
+        constexpr double twoTo84 = 19342813113834066795298816.0;
+        const __m128i high =
+            _mm_xor_si128(_mm_srli_epi64(v, 32), broadcast64(exponent84 | highOffset));
+        const __m128i low =
+            _mm_or_si128(_mm_and_si128(v, broadcast64(0xFFFFFFFFu)), broadcast64(exponent52));
+        const double highBias = twoTo84 + twoTo52 + static_cast<double>(highOffset) * twoTo32;
+        return _mm_add_pd(_mm_sub_pd(_mm_castsi128_pd(high), broadcast(highBias)),
+                          _mm_castsi128_pd(low));
+    }
+}
+
+}  // namespace bitfcns::lanes
