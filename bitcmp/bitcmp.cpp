@@ -1,15 +1,15 @@
-// bitcmp: the entry point, the integer path (the engine's Complement family)
+// bitcmp: the entry point, the integer path (the host's complement loop)
 // and the double path (the complement of each element taken for the assumed
 // class, tested in the same pass).
 #include "bitcmp/bitcmp_ftor.hpp"
 #include "bitfcns/entry_points.hpp"
-#include "engine/operator_families.hpp"
 #include "engine/parallel_driver.hpp"
 #include "frame/array.hpp"
 #include "frame/assumed_type.hpp"
 #include "frame/checked_lanes.hpp"
 #include "frame/class_types.hpp"
 #include "frame/exception.hpp"
+#include "frame/math_routines.hpp"
 #include "frame/message_tags.hpp"
 
 namespace bitfcns {
@@ -39,7 +39,7 @@ void bitcmpIntegerOperand(int, zqArraySlot* plhs, int nrhs, const zqArray_tag** 
         cls,
         [&]<class Tag>(Tag) {
             using T = typename Tag::type;
-            Complement::run(dataOf<T>(result.get()), dataOf<T>(operand), 1, n);
+            mu::IntVectorBitcmp<T>(dataOf<T>(result.get()), dataOf<T>(operand), 1, 1, n);
         },
         [] { raiseError<errors::firstArgNotInt>(); });
     plhs[0] = std::move(result);

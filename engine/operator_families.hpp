@@ -150,20 +150,4 @@ struct RightShift {
     }
 };
 
-// bitcmp: every element complemented, bit by bit.
-struct Complement {
-    template <class T>
-    using Record = bitfcnsUnarySIMDVectorOp<T, IntComplementSSE2Ftor, IntComplementFtor<T>>;
-
-    template <class T>
-    static Record<T> record(T* out, const T* data, unsigned long dataStride,
-                            unsigned long n) noexcept {
-        return {data, out, dataStride, n, {}, {}};
-    }
-    template <class T>
-    static void run(T* out, const T* data, unsigned long dataStride, unsigned long n) {
-        runVectorOp(record(out, data, dataStride, n));
-    }
-};
-
 }  // namespace bitfcns

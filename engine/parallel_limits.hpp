@@ -48,9 +48,6 @@ inline constexpr unsigned long getOneBit = detail::byWidth<T>(4500000, 3500000, 
 template <class T>  // IntBitsetSSE2Ftor: one position, new bit values of class T
 inline constexpr unsigned long setBitFromValues = detail::byWidth<T>(3500000, 1500000, 800000,
                                                                      detail::noOperator);
-// Every element complemented: parallel from 256 KiB of result at any width.
-template <class T>  // IntComplementSSE2Ftor
-inline constexpr unsigned long complement = detail::byWidth<T>(262144, 131072, 65536, 32768);
 // The step down from 16 to 8 bits in the two shifts is wanted.
 template <class T>  // IntLeftShiftSSE2Ftor: one shift count to the left
 inline constexpr unsigned long leftShift = detail::byWidth<T>(400000, 3500000, 2000000, 1000000);

@@ -199,23 +199,6 @@ private:
     std::uint32_t count_;
 };
 
-// Every bit of in inverted: XOR with all ones, the same at every width.
-class IntComplementSSE2Ftor {
-public:
-    template <class T>
-    static constexpr unsigned long parallelLimit = limits::complement<T>;
-
-    template <class T>
-    auto prepare() const noexcept {
-        const __m128i ones = _mm_set1_epi32(-1);
-        return [ones](__m128i v) noexcept { return _mm_xor_si128(v, ones); };
-    }
-};
-template <class T>
-struct IntComplementFtor {
-    T operator()(T x) const noexcept { return static_cast<T>(~x); }
-};
-
 // (in1 shifted right logically by the count) AND in2, for signed T as well.
 // Reads one bit of each element, in2 being a broadcast 1.
 class IntRightShiftAndSSE2Ftor {

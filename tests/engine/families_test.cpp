@@ -70,10 +70,6 @@ void forEachFamily(auto check) {
         [](O o, P p) { GetOneBit::run(o.out, o.data, o.dataStride, o.n, p); },
         [](T a, T, P p) { return T(bitsOf(a) >> p & 1); });
     check(
-        "Complement", Complement::Record<T>::parallelLimit, false,
-        [](O o, P) { Complement::run(o.out, o.data, o.dataStride, o.n); },
-        [](T a, T, P) { return T(~bitsOf(a)); });
-    check(
         "LeftShift", LeftShift::Record<T>::parallelLimit, false,
         [](O o, P p) { LeftShift::run(o.out, o.data, o.dataStride, o.n, p); },
         [](T a, T, P p) { return T(bitsOf(a) << p); });
