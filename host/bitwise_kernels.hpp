@@ -41,6 +41,8 @@ inline __m128i load(const std::byte* p) {
     return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
 }
 inline void store(std::byte* p, __m128i v) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), v); }
+// A store that bypasses the caches; `p` is 16-byte aligned.
+inline void stream(std::byte* p, __m128i v) { _mm_stream_si128(reinterpret_cast<__m128i*>(p), v); }
 inline std::uint64_t loadWord(const std::byte* p) {
     std::uint64_t word;
     std::memcpy(&word, p, sizeof word);
@@ -85,20 +87,36 @@ void combineBytes(std::byte* out, const std::byte* a, const std::byte* b, std::s
     }
 }
 
+// How the vector body writes its chunks: through the caches, or around them
+// (16-byte aligned `out` only), for a result too large to stay in cache
+// that no input shares, so that no line of it is read in before it is
+// overwritten.
+enum class ChunkStores { cached, streamed };
+
 // out[i] = a[i] op pattern[i % 16] for the `count` bytes, where `a` starts on
-// an element boundary and the pattern repeats one element. `out` may equal `a`.
-template <class Op>
+// an element boundary and the pattern repeats one element. `out` may equal `a`
+// (with cached stores).
+template <class Op, ChunkStores stores = ChunkStores::cached>
 void combineBytesWithPattern(std::byte* out, const std::byte* a, __m128i pattern,
                              std::size_t count) {
+    const auto store = [](std::byte* p, __m128i v) {
+        if constexpr (stores == ChunkStores::streamed) {
+            bytes::stream(p, v);
+        } else {
+            bytes::store(p, v);
+        }
+    };
     std::size_t i = 0;
     // Vector body: two chunks per step, then one.
     for (; i + 32 <= count; i += 32) {
         const __m128i low = Op::vector(bytes::load(a + i), pattern);
         const __m128i high = Op::vector(bytes::load(a + i + 16), pattern);
-        bytes::store(out + i, low);
-        bytes::store(out + i + 16, high);
+        store(out + i, low);
+        store(out + i + 16, high);
     }
-    for (; i + 16 <= count; i += 16) bytes::store(out + i, Op::vector(bytes::load(a + i), pattern));
+    for (; i + 16 <= count; i += 16) store(out + i, Op::vector(bytes::load(a + i), pattern));
+    // Streamed chunks are ordered before anything the caller does next.
+    if constexpr (stores == ChunkStores::streamed) _mm_sfence();
     // Scalar tail: it starts on a multiple of 16, so its byte j meets pattern byte j.
     alignas(16) std::byte tailPattern[16];
     bytes::store(tailPattern, pattern);

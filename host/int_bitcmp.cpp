@@ -11,6 +11,7 @@
 #include <tbb/parallel_for.h>
 
 #include <cstddef>
+#include <cstdint>
 #include <tuple>
 
 namespace host {
@@ -18,24 +19,47 @@ namespace {
 
 constexpr std::size_t kComplementGrainBytes = std::size_t{64} << 10;
 
+// Results from this size on, with their input, fill the last-level cache
+// (32 MiB on the machines this runs on) or more: ordinary stores would read
+// every line of such a result in before overwriting it.
+constexpr std::size_t kStreamingResultBytes = std::size_t{16} << 20;
+
+template <ChunkStores stores>
 void complementSerial(std::byte* out, const std::byte* in, std::size_t count) {
-    combineBytesWithPattern<BitxorBytes>(out, in, _mm_set1_epi32(-1), count);
+    combineBytesWithPattern<BitxorBytes, stores>(out, in, _mm_set1_epi32(-1), count);
 }
 
-// Complements `count` contiguous bytes; `out` may equal `in`.
-void complementBytes(std::byte* out, const std::byte* in, std::size_t count) {
-    if (count < parallelResultBytes) {
-        complementSerial(out, in, count);
-        return;
-    }
+// Streaming stores for a large result on a 16-byte boundary that shares no
+// byte with its input; every subrange then starts on a boundary too.
+bool streamsResult(const std::byte* out, const std::byte* in, std::size_t count) {
+    const auto to = reinterpret_cast<std::uintptr_t>(out);
+    const auto from = reinterpret_cast<std::uintptr_t>(in);
+    const bool disjoint = to + count <= from || from + count <= to;
+    return count >= kStreamingResultBytes && disjoint && to % 16 == 0;
+}
+
+// Complements `count` contiguous bytes, split over workers in chunks of 16.
+template <ChunkStores stores>
+void complementInParallel(std::byte* out, const std::byte* in, std::size_t count) {
     const std::size_t chunks = count / 16;
     tbb::parallel_for(tbb::blocked_range<std::size_t>(0, chunks, kComplementGrainBytes / 16),
                       [=](const tbb::blocked_range<std::size_t>& range) {
                           const std::size_t begin = range.begin() * 16;
                           // The last subrange also takes the bytes past the last full chunk.
                           const std::size_t end = range.end() == chunks ? count : range.end() * 16;
-                          complementSerial(out + begin, in + begin, end - begin);
+                          complementSerial<stores>(out + begin, in + begin, end - begin);
                       });
+}
+
+// Complements `count` contiguous bytes; `out` may equal `in`.
+void complementBytes(std::byte* out, const std::byte* in, std::size_t count) {
+    if (count < parallelResultBytes) {
+        complementSerial<ChunkStores::cached>(out, in, count);
+    } else if (streamsResult(out, in, count)) {
+        complementInParallel<ChunkStores::streamed>(out, in, count);
+    } else {
+        complementInParallel<ChunkStores::cached>(out, in, count);
+    }
 }
 
 }  // namespace
