@@ -1,5 +1,6 @@
 // The element functions of bitget: BitgetFtor<T> for double values taken for
-// integers of class T (BitgetLanes<T> two at a time with one position), and
+// integers of class T (BitgetLanes<T> two at a time with one position,
+// BitgetPositionsLanes<T> with an array of positions), and
 // bitgetVVFtor<T, U> for integer values of class T with an array of
 // positions of class U. A position p names bit p - 1, the least significant
 // bit being position 1.
@@ -7,9 +8,11 @@
 
 #include "engine/parallel_limits.hpp"
 #include "engine/simd_functors.hpp"
+#include "frame/class_types.hpp"
 #include "frame/double_lanes.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/integer_conversion.hpp"
+#include "frame/position_scan.hpp"
 
 #include <cstdint>
 #include <type_traits>
@@ -62,6 +65,30 @@ struct BitgetLanes {
     __m128d apply(__m128d x) const noexcept {
         const __m128i bit =
             _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
+        return _mm_and_pd(_mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit)),
+                          lanes::broadcast(1.0));
+    }
+};
+
+// BitgetFtor<T> with an array of double positions, as a lane kernel of the
+// double path's checked loop: each value's pattern in T shifted right by its
+// own bit index, the low bit as 0.0 or 1.0.
+template <class T>
+struct BitgetPositionsLanes {
+    static constexpr int arity = 2;
+    static constexpr unsigned long parallelLimit = limits::bitgetOnDouble;
+
+    scan_detail::LaneTest<T> fits;
+    position_scan_detail::PositionLanes validPosition{bitWidth<T>};
+
+    __m128d check(__m128d x, __m128d p) const noexcept {
+        return _mm_and_pd(fits(x), validPosition(p));
+    }
+
+    __m128d apply(__m128d x, __m128d p) const noexcept {
+        const __m128i index = lanes::countLanes(_mm_sub_pd(p, lanes::broadcast(1.0)));
+        const __m128i bit = _mm_and_si128(lanes::shiftRightEach64(lanes::patternOf<T>(x), index),
+                                          lanes::broadcast64(1));
         return _mm_and_pd(_mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit)),
                           lanes::broadcast(1.0));
     }

@@ -89,19 +89,18 @@ void bitgetDoubleDriver(const zqArray_tag* values, const zqArray_tag* positions,
     const unsigned long n = numberOfElements(result);
     const double* x = dataOf<double>(values);
     const double* p = dataOf<double>(positions);
-    if (positionsScalar && getBitsAtOnePosition<T>(x, *p, dataOf<double>(result), n)) return;
+    double* out = dataOf<double>(result);
+    if (positionsScalar && getBitsAtOnePosition<T>(x, *p, out, n)) return;
+    if (!valuesScalar && !positionsScalar &&
+        runCheckedLanes(BitgetPositionsLanes<T>{}, x, p, out, n, &runInRanges))
+        return;
     // All values before any position, so a bad value hides a bad position.
     if (valuesScalar || n != 0) {
         if (!allFitInteger<T>(x, valuesScalar ? 1 : n)) raiseError<VESPRA::bitget::outOfRange>();
     }
     if (positionsScalar || n != 0) requireValidPositions<T>(p, positionsScalar ? 1 : n);
-    runVectorOp(bitfcnsTwoInputVectorOp<double, double, BitgetFtor<T>>{x,
-                                                                       p,
-                                                                       dataOf<double>(result),
-                                                                       valuesScalar ? 0ul : 1ul,
-                                                                       positionsScalar ? 0ul : 1ul,
-                                                                       n,
-                                                                       {}});
+    runVectorOp(bitfcnsTwoInputVectorOp<double, double, BitgetFtor<T>>{
+        x, p, out, valuesScalar ? 0ul : 1ul, positionsScalar ? 0ul : 1ul, n, {}});
 }
 
 template <class T>

@@ -80,8 +80,8 @@ bool shiftByOneCount(const double* values, double count, double* out, unsigned l
 // Validates the values for class T and the counts, then shifts into
 // `result`, refusing a bad value before a bad count. In place every element
 // is tested before any is written, so a refused call leaves values whose
-// storage the result shares untouched; a fresh result by one count is
-// tested and written in one pass. A scalar operand is tested even when the
+// storage the result shares untouched; a fresh result by one count or by
+// an array of counts is tested and written in one pass. A scalar operand is tested even when the
 // other is empty.
 template <class T>
 void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, zqArray_tag* result,
@@ -89,17 +89,16 @@ void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, z
     const unsigned long n = numberOfElements(result);
     const double* values = dataOf<const double>(first);
     const double* counts = dataOf<const double>(second);
-    if (secondIsScalar && shiftByOneCount<T>(values, *counts, dataOf<double>(result), n)) return;
+    double* out = dataOf<double>(result);
+    if (secondIsScalar && shiftByOneCount<T>(values, *counts, out, n)) return;
+    if (!firstIsScalar && !secondIsScalar &&
+        runCheckedLanes(BitshiftCountsLanes<T>{}, values, counts, out, n, &runInRanges))
+        return;
     if (!allFitInteger<T>(values, firstIsScalar ? 1 : n)) raiseError<errors::outOfRange>();
     if (!allWholeCounts(counts, secondIsScalar ? 1 : n)) raiseError<errors::inputsMustBeIntegers>();
     if (n == 0) return;
-    runVectorOp(bitfcnsTwoInputVectorOp<double, double, BitshiftFtor<T>>{values,
-                                                                         counts,
-                                                                         dataOf<double>(result),
-                                                                         firstIsScalar ? 0ul : 1ul,
-                                                                         secondIsScalar ? 0ul : 1ul,
-                                                                         n,
-                                                                         {}});
+    runVectorOp(bitfcnsTwoInputVectorOp<double, double, BitshiftFtor<T>>{
+        values, counts, out, firstIsScalar ? 0ul : 1ul, secondIsScalar ? 0ul : 1ul, n, {}});
 }
 
 // Both operands double (or the counts converted to double): the values are

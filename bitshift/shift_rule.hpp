@@ -1,11 +1,13 @@
 // The shift rule of bitshift as element functors: BitshiftFtor<T> for doubles
 // taken for integers of class T (BitshiftLanes<T, kind> two at a time by one
-// count), bitshiftVVFtor<T, U> for an integer value and a count of any
+// count, BitshiftCountsLanes<T> by an array of counts), bitshiftVVFtor<T, U>
+// for an integer value and a count of any
 // numeric class. A positive count shifts left, a negative
 // one right; counts at or beyond the width are answered without a shift, so
 // no shift by the width or more is ever made.
 #pragma once
 
+#include "bitshift/count_validation.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine/simd_functors.hpp"
 #include "frame/class_types.hpp"
@@ -133,6 +135,55 @@ struct BitshiftLanes {
         } else {
             return _mm_and_pd(_mm_cmplt_pd(x, _mm_setzero_pd()), fill);
         }
+    }
+};
+
+// BitshiftFtor<T> with an array of double counts, as a lane kernel of the
+// double path's checked loop: each lane shifted by its own count, to the
+// left as BitshiftLanes<T, left> does, to the right as a floor of x / 2^k,
+// and shifted out at or beyond the width. A register whose counts all point
+// the same way computes that way only.
+template <class T>
+struct BitshiftCountsLanes {
+    static constexpr int arity = 2;
+    static constexpr unsigned long parallelLimit = limits::bitshiftOnDouble;
+
+    scan_detail::LaneTest<T> fits;
+    WholeCountLanes wholeCount;
+
+    __m128d check(__m128d x, __m128d c) const noexcept {
+        return _mm_and_pd(fits(x), wholeCount(c));
+    }
+
+    __m128d apply(__m128d x, __m128d c) const noexcept {
+        const __m128d zero = _mm_setzero_pd();
+        const __m128d width = lanes::broadcast(bitWidth<T>);
+        const __m128d within = _mm_cmplt_pd(_mm_andnot_pd(lanes::broadcast(-0.0), c), width);
+        // Within the width, so 32 bits hold every count below.
+        const __m128d count = _mm_min_pd(_mm_max_pd(c, _mm_sub_pd(zero, width)), width);
+        const __m128d leftward = _mm_cmpgt_pd(c, zero);
+        __m128d shifted;
+        switch (_mm_movemask_pd(leftward)) {
+            case 0: shifted = shiftRight(x, count); break;
+            case 3: shifted = shiftLeft(x, count); break;
+            default: shifted = lanes::select(leftward, shiftLeft(x, count), shiftRight(x, count));
+        }
+        // Shifted out: -1 for a negative x shifted right, 0 otherwise.
+        const __m128d out = _mm_and_pd(_mm_and_pd(_mm_cmplt_pd(x, zero), _mm_cmplt_pd(c, zero)),
+                                       lanes::broadcast(-1.0));
+        return lanes::select(within, shifted, out);
+    }
+
+private:
+    static __m128d shiftLeft(__m128d x, __m128d count) noexcept {
+        return lanes::fromPattern<T>(
+            lanes::shiftLeftEach64(lanes::patternOf<T>(x), lanes::countLanes(count)));
+    }
+
+    // count <= 0: the floor of x * 2^count.
+    static __m128d shiftRight(__m128d x, __m128d count) noexcept {
+        const __m128d scaled = _mm_mul_pd(x, lanes::powerOfTwo(count));
+        return sizeof(T) == 8 ? lanes::floorFinite(scaled) : lanes::floorBelow2To51(scaled);
     }
 };
 

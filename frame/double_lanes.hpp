@@ -1,7 +1,8 @@
 // SSE2 arithmetic on two doubles at a time that hold whole numbers of an
 // integer class T: their two's complement bit patterns, floors, and doubles
-// made back from patterns of T. Exact to the last bit; a 64-bit pattern goes
-// back to the nearest double (ties to even), as integerToDouble does.
+// made back from patterns of T, and patterns shifted by a count of their own
+// in each lane. Exact to the last bit; a 64-bit pattern goes back to the
+// nearest double (ties to even), as integerToDouble does.
 //
 // Lanes that hold no whole number of T (refused by the caller's test) give
 // meaningless bits and never undefined behaviour: everything here is
@@ -105,6 +106,41 @@ __m128d fromPattern(__m128i v) noexcept {
         return _mm_add_pd(_mm_sub_pd(_mm_castsi128_pd(high), broadcast(highBias)),
                           _mm_castsi128_pd(low));
     }
+}
+
+// Each lane, a whole number from -2^31 to below 2^31, as a 64-bit integer
+// lane that holds it zero-extended from 32 bits: a count for the shifts
+// below when it isn't negative, and one of 2^32 or more (which shifts
+// everything out) when it is. Other lanes give some count, never undefined
+// behaviour.
+inline __m128i countLanes(__m128d x) noexcept {
+    return _mm_unpacklo_epi32(_mm_cvttpd_epi32(x), _mm_setzero_si128());
+}
+
+// 2^k for each lane k, a whole number from -1022 to 1023: the exponent
+// field made from k directly.
+inline __m128d powerOfTwo(__m128d k) noexcept {
+    const __m128i biased = _mm_add_epi32(_mm_cvttpd_epi32(k), _mm_set1_epi32(1023));
+    return _mm_castsi128_pd(_mm_slli_epi64(_mm_unpacklo_epi32(biased, _mm_setzero_si128()), 52));
+}
+
+// Each 64-bit lane shifted by the count in its own lane of `counts` (from
+// countLanes; 64 or more gives 0): SSE2 shifts a whole register by one
+// count, so each lane's count shifts a copy and the lanes are put together.
+inline __m128i shiftLeftEach64(__m128i v, __m128i counts) noexcept {
+    const __m128i low = _mm_sll_epi64(v, counts);
+    const __m128i high = _mm_sll_epi64(v, _mm_unpackhi_epi64(counts, counts));
+    return _mm_castpd_si128(_mm_move_sd(_mm_castsi128_pd(high), _mm_castsi128_pd(low)));
+}
+inline __m128i shiftRightEach64(__m128i v, __m128i counts) noexcept {
+    const __m128i low = _mm_srl_epi64(v, counts);
+    const __m128i high = _mm_srl_epi64(v, _mm_unpackhi_epi64(counts, counts));
+    return _mm_castpd_si128(_mm_move_sd(_mm_castsi128_pd(high), _mm_castsi128_pd(low)));
+}
+
+// a where `mask` is all ones, b where it is zero.
+inline __m128d select(__m128d mask, __m128d a, __m128d b) noexcept {
+    return _mm_or_pd(_mm_and_pd(mask, a), _mm_andnot_pd(mask, b));
 }
 
 }  // namespace bitfcns::lanes

@@ -15,11 +15,26 @@ namespace bitfcns {
 
 namespace position_scan_detail {
 
+// bitIsValid of two double positions: all ones in each lane that holds a
+// whole number from 1 to the width. Between those bounds a position is
+// whole exactly when truncating it to 32 bits and back gives it again; NaN
+// fails every compare, and the infinities the range.
+struct PositionLanes {
+    __m128d one = _mm_set1_pd(1.0);
+    __m128d top;
+
+    explicit PositionLanes(int width) noexcept : top(_mm_set1_pd(static_cast<double>(width))) {}
+
+    __m128d operator()(__m128d b) const noexcept {
+        const __m128d whole = _mm_cmpeq_pd(_mm_cvtepi32_pd(_mm_cvttpd_epi32(b)), b);
+        return _mm_and_pd(whole, _mm_and_pd(_mm_cmpge_pd(b, one), _mm_cmple_pd(b, top)));
+    }
+};
+
 // Whether all `count` positions of one block are valid. An integer block is
 // one or-reduction of the unsigned compare of bitIsValid, which the compiler
-// vectorizes. A floating position between 1 and the width is whole exactly
-// when truncating it to 32 bits and back gives it again; NaN fails every
-// compare, and the infinities the range.
+// vectorizes; double positions go through PositionLanes, single ones the
+// same test four at a time.
 template <class U>
 bool blockValid(const U* positions, unsigned long count, int width) noexcept {
     if constexpr (std::is_integral_v<U>) {
@@ -30,16 +45,12 @@ bool blockValid(const U* positions, unsigned long count, int width) noexcept {
             invalid |= static_cast<Bits>(static_cast<Bits>(positions[i]) - Bits{1}) > highestIndex;
         return invalid == 0;
     } else if constexpr (std::is_same_v<U, double>) {
-        const __m128d one = _mm_set1_pd(1.0);
-        const __m128d top = _mm_set1_pd(static_cast<double>(width));
-        __m128d valid = _mm_cmpeq_pd(one, one);
+        const PositionLanes test(width);
+        __m128d valid = _mm_castsi128_pd(_mm_set1_epi32(-1));
         unsigned long i = 0;
         for (; i + 2 <= count; i += 2) {
             __builtin_prefetch(positions + i + 256);  // 2 KiB ahead, as the other scans
-            const __m128d b = _mm_loadu_pd(positions + i);
-            const __m128d whole = _mm_cmpeq_pd(_mm_cvtepi32_pd(_mm_cvttpd_epi32(b)), b);
-            valid = _mm_and_pd(
-                valid, _mm_and_pd(whole, _mm_and_pd(_mm_cmpge_pd(b, one), _mm_cmple_pd(b, top))));
+            valid = _mm_and_pd(valid, test(_mm_loadu_pd(positions + i)));
         }
         return _mm_movemask_pd(valid) == 3 && (i == count || bitIsValid(positions[i], width));
     } else {

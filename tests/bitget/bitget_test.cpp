@@ -47,11 +47,21 @@ TYPED_TEST(IntegerValues, SerialAndParallelRunsFreshAndInPlace) {
     }
 }
 
-// Doubles at the edges of T, at every position.
+// Doubles at the edges of T, at every position: one position for all, then
+// arrays that pair each edge with every position in turn.
 TYPED_TEST(IntegerValues, DoubleEdgesAtEveryPosition) {
-    const auto values = makeOf(edgeDoublesOf<TypeParam>()), type = classNameOf<TypeParam>();
-    for (double p = 1; p <= sizeof(TypeParam) * 8; ++p)
+    constexpr double width = sizeof(TypeParam) * 8;
+    const std::vector<double> edges = edgeDoublesOf<TypeParam>();
+    const auto values = makeOf(edges), type = classNameOf<TypeParam>();
+    for (double p = 1; p <= width; ++p)
         expectAsModel({values.get(), scalarOf(p).get(), type.get()});
+    std::vector<double> pairedValues, pairedPositions;
+    for (double x : edges)
+        for (double p = 1; p <= width; ++p) {
+            pairedValues.push_back(x);
+            pairedPositions.push_back(p);
+        }
+    expectAsModel({makeOf(pairedValues).get(), makeOf(pairedPositions).get(), type.get()});
 }
 
 TEST(DoubleValues, SerialAndParallelRunsFreshAndInPlace) {

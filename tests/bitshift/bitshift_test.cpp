@@ -51,12 +51,22 @@ TYPED_TEST(EveryValueClass, SerialAndParallelRunsFreshAndInPlace) {
     }
 }
 
-// Doubles at the edges of T by every count within the width and one beyond.
+// Doubles at the edges of T by every count within the width and one beyond:
+// one count for all, then arrays that pair each edge with every count in
+// turn, so that neighbouring elements shift by different counts and ways.
 TYPED_TEST(EveryValueClass, DoubleEdgesByEveryCount) {
     constexpr double width = sizeof(TypeParam) * 8;
-    const auto values = makeOf(edgeDoublesOf<TypeParam>()), type = classNameOf<TypeParam>();
+    const std::vector<double> edges = edgeDoublesOf<TypeParam>();
+    const auto values = makeOf(edges), type = classNameOf<TypeParam>();
     for (double c = -width - 1; c <= width + 1; ++c)
         expectAsModel({values.get(), scalarOf(c).get(), type.get()});
+    std::vector<double> pairedValues, pairedCounts;
+    for (double x : edges)
+        for (double c = -width - 1; c <= width + 1; ++c) {
+            pairedValues.push_back(x);
+            pairedCounts.push_back(c);
+        }
+    expectAsModel({makeOf(pairedValues).get(), makeOf(pairedCounts).get(), type.get()});
 }
 
 TEST(DoubleValues, SerialAndParallelRunsFreshAndInPlace) {
