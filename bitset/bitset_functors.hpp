@@ -11,9 +11,11 @@
 #pragma once
 
 #include "engine/parallel_limits.hpp"
+#include "frame/class_types.hpp"
 #include "frame/double_lanes.hpp"
 #include "frame/element_scan.hpp"
 #include "frame/integer_conversion.hpp"
+#include "frame/position_scan.hpp"
 
 #include <cstdint>
 #include <type_traits>
@@ -126,6 +128,40 @@ struct BitsetLanes {
         const __m128i bit =
             _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
         const __m128d isSet = _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit));
+        const __m128d addend = set ? _mm_andnot_pd(isSet, change) : _mm_and_pd(isSet, change);
+        return _mm_add_pd(x, addend);
+    }
+};
+
+// BitsetFtor<T> with an array of double positions and one V for every
+// element, as a lane kernel of the double path's checked loop: BitsetLanes
+// with each lane's own bit index and weight.
+template <class T, bool set>
+struct BitsetPositionsLanes {
+    static constexpr int arity = 2;
+    static constexpr unsigned long parallelLimit = limits::bitsetOnDouble;
+
+    scan_detail::LaneTest<T> fits;
+    position_scan_detail::PositionLanes validPosition{bitWidth<T>};
+
+    __m128d check(__m128d x, __m128d b) const noexcept {
+        return _mm_and_pd(fits(x), validPosition(b));
+    }
+
+    __m128d apply(__m128d x, __m128d b) const noexcept {
+        const __m128d index = _mm_sub_pd(b, lanes::broadcast(1.0));
+        const __m128i bit =
+            _mm_and_si128(lanes::shiftRightEach64(lanes::patternOf<T>(x), lanes::countLanes(index)),
+                          lanes::broadcast64(1));
+        const __m128d isSet = _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit));
+        // The weight is negative where the sign bit of a signed T is set, or
+        // another bit cleared.
+        __m128d negative = _mm_setzero_pd();
+        if constexpr (std::is_signed_v<T>)
+            negative = _mm_cmpeq_pd(b, lanes::broadcast(bitWidth<T>));
+        if constexpr (!set) negative = _mm_xor_pd(negative, _mm_cmpeq_pd(b, b));
+        const __m128d change =
+            _mm_xor_pd(lanes::powerOfTwo(index), _mm_and_pd(negative, lanes::broadcast(-0.0)));
         const __m128d addend = set ? _mm_andnot_pd(isSet, change) : _mm_and_pd(isSet, change);
         return _mm_add_pd(x, addend);
     }

@@ -36,19 +36,34 @@ bool setAtOnePosition(const double* values, double position, bool value, double*
     return runCheckedLanes(BitsetLanes<T, false>(index), values, nullptr, out, n, &runInRanges);
 }
 
+// The same with an array of positions, one for each element of A.
+template <class T>
+bool setAtPositions(const double* values, const double* positions, bool value, double* out,
+                    unsigned long n) {
+    if (value)
+        return runCheckedLanes(BitsetPositionsLanes<T, true>{}, values, positions, out, n,
+                               &runInRanges);
+    return runCheckedLanes(BitsetPositionsLanes<T, false>{}, values, positions, out, n,
+                           &runInRanges);
+}
+
 // Validates all of A, then all of BIT, for class T, and fills the result,
 // which exists already. A scalar operand is validated even when the result
 // is empty. In place nothing is written before both have passed, so a
-// refusal leaves A untouched; a fresh result with one position and one V is
-// tested and written in one pass. V needs no test: it is logical.
+// refusal leaves A untouched; a fresh result with one V, and one position or
+// an array of them, is tested and written in one pass. V needs no test: it
+// is logical.
 template <class T>
 void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool* valueData,
                         zqArray_tag* result, bool scalarA, bool scalarBit, bool scalarValue) {
     const unsigned long n = numberOfElements(result);
     const double* values = dataOf<double>(a);
     const double* positions = dataOf<double>(bit);
-    if (scalarBit && scalarValue &&
-        setAtOnePosition<T>(values, *positions, *valueData, dataOf<double>(result), n))
+    double* out = dataOf<double>(result);
+    if (scalarBit && scalarValue && setAtOnePosition<T>(values, *positions, *valueData, out, n))
+        return;
+    if (!scalarA && !scalarBit && scalarValue &&
+        setAtPositions<T>(values, positions, *valueData, out, n))
         return;
     if (!allFitInteger<T>(values, scalarA ? 1 : n)) raiseError<errors::outOfRange>();
     checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>);
@@ -56,7 +71,7 @@ void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool
         bitfcnsThreeInputVectorOp<double, double, bool, BitsetFtor<T>>{values,
                                                                        positions,
                                                                        valueData,
-                                                                       dataOf<double>(result),
+                                                                       out,
                                                                        strideOf(scalarA),
                                                                        strideOf(scalarBit),
                                                                        strideOf(scalarValue),

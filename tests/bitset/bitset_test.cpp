@@ -82,12 +82,25 @@ template <class T>
 class EveryClass : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryClass, IntegerTypes);
 
-// Doubles at the edges of T, each bit set and cleared.
+// Doubles at the edges of T, each bit set and cleared: one position for all,
+// then arrays that pair each edge with every position in turn.
 TYPED_TEST(EveryClass, DoubleEdgesAtEveryPosition) {
-    const auto values = makeOf(edgeDoublesOf<TypeParam>()), type = classNameOf<TypeParam>();
-    for (double p = 1; p <= sizeof(TypeParam) * 8; ++p)
-        for (bool v : {false, true})
-            expectAsModel({values.get(), scalarOf(p).get(), scalarOf(double(v)).get(), type.get()});
+    constexpr double width = sizeof(TypeParam) * 8;
+    const std::vector<double> edges = edgeDoublesOf<TypeParam>();
+    const auto values = makeOf(edges), type = classNameOf<TypeParam>();
+    std::vector<double> pairedValues, pairedPositions;
+    for (double x : edges)
+        for (double p = 1; p <= width; ++p) {
+            pairedValues.push_back(x);
+            pairedPositions.push_back(p);
+        }
+    const auto manyValues = makeOf(pairedValues), manyPositions = makeOf(pairedPositions);
+    for (bool v : {false, true}) {
+        const auto value = scalarOf(double(v));
+        for (double p = 1; p <= width; ++p)
+            expectAsModel({values.get(), scalarOf(p).get(), value.get(), type.get()});
+        expectAsModel({manyValues.get(), manyPositions.get(), value.get(), type.get()});
+    }
 }
 
 // The bad position stands last, after every other has been converted.
