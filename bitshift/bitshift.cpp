@@ -80,8 +80,9 @@ bool shiftByOneCount(const double* values, double count, double* out, unsigned l
 // Validates the values for class T and the counts, then shifts into
 // `result`, refusing a bad value before a bad count. In place every element
 // is tested before any is written, so a refused call leaves values whose
-// storage the result shares untouched; a fresh result by one count or by
-// an array of counts is tested and written in one pass. A scalar operand is tested even when the
+// storage the result shares untouched; a fresh result by one count, or by
+// an array of counts for a class of up to 32 bits, is tested and written in
+// one pass. A scalar operand is tested even when the
 // other is empty.
 template <class T>
 void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, zqArray_tag* result,
@@ -91,9 +92,13 @@ void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, z
     const double* counts = dataOf<const double>(second);
     double* out = dataOf<double>(result);
     if (secondIsScalar && shiftByOneCount<T>(values, *counts, out, n)) return;
-    if (!firstIsScalar && !secondIsScalar &&
-        runCheckedLanes(BitshiftCountsLanes<T>{}, values, counts, out, n, &runInRanges))
-        return;
+    // A 64-bit pattern shifted left goes back to a double by exponent sums
+    // that cost more in lanes than the plain loop's scalar conversions.
+    if constexpr (sizeof(T) < 8) {
+        if (!firstIsScalar && !secondIsScalar &&
+            runCheckedLanes(BitshiftCountsLanes<T>{}, values, counts, out, n, &runInRanges))
+            return;
+    }
     if (!allFitInteger<T>(values, firstIsScalar ? 1 : n)) raiseError<errors::outOfRange>();
     if (!allWholeCounts(counts, secondIsScalar ? 1 : n)) raiseError<errors::inputsMustBeIntegers>();
     if (n == 0) return;

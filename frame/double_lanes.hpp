@@ -26,7 +26,6 @@ inline __m128i broadcast64(std::uint64_t bits) noexcept {
 // low 32 bits of x's two's complement.
 inline constexpr double lowWordMagic = 6755399441055744.0;
 inline constexpr double twoTo32 = 4294967296.0;
-inline constexpr double twoToMinus32 = 1.0 / 4294967296.0;
 inline constexpr double twoTo52 = 4503599627370496.0;
 
 // The low 32 bits of each lane's two's complement, in the low half of its
@@ -57,14 +56,17 @@ inline __m128d floorFinite(__m128d y) noexcept {
 }
 
 // The 64-bit two's complement pattern of each lane, a whole number from
-// -2^63 to below 2^64: the floor of x / 2^32 gives the high word, and
-// x less that many 2^32 (exact: a whole number from 0 to below 2^32) the
-// low one.
+// -2^63 to below 2^64: each lane converted on its own by the scalar
+// truncating conversion, which takes -2^63 to below 2^63; from 2^63 up
+// (uint64 only) x less 2^64, exact there and of the same pattern, takes its
+// place. A lane outside the range gives the conversion's indefinite value.
 inline __m128i pattern64(__m128d x) noexcept {
-    const __m128d high = floorBelow2To51(_mm_mul_pd(x, broadcast(twoToMinus32)));
-    const __m128d low = _mm_sub_pd(x, _mm_mul_pd(high, broadcast(twoTo32)));
-    return _mm_or_si128(_mm_slli_epi64(lowWord(high), 32),
-                        _mm_and_si128(lowWord(low), broadcast64(0xFFFFFFFFu)));
+    const __m128d twoTo63 = broadcast(9223372036854775808.0);
+    const __m128d twoTo64 = broadcast(18446744073709551616.0);
+    const __m128d wrapped = _mm_sub_pd(x, _mm_and_pd(_mm_cmpge_pd(x, twoTo63), twoTo64));
+    const __m128i low = _mm_cvtsi64_si128(_mm_cvttsd_si64(wrapped));
+    const __m128i high = _mm_cvtsi64_si128(_mm_cvttsd_si64(_mm_unpackhi_pd(wrapped, wrapped)));
+    return _mm_unpacklo_epi64(low, high);
 }
 
 // The pattern of each lane in T: all 64 bits for the 64-bit classes, the
