@@ -133,6 +133,39 @@ struct BitsetLanes {
     }
 };
 
+// BitsetFtor<T> with one position and an array of V, as a lane kernel of
+// the double path's checked loop: BitsetLanes setting the bit where V is
+// true and clearing it where V is false. V, logical, needs no test.
+template <class T>
+struct BitsetValuesLanes {
+    static constexpr int arity = 2;
+    static constexpr unsigned long parallelLimit = limits::bitsetOnDouble;
+    using Second = bool;
+
+    scan_detail::LaneTest<T> fits;
+    __m128i bitIndex;   // in the low 64 bits
+    __m128d setWeight;  // added where the bit is clear and V true
+
+    explicit BitsetValuesLanes(std::uint32_t index) noexcept
+        : bitIndex(_mm_cvtsi32_si128(static_cast<int>(index))),
+          setWeight(lanes::broadcast(std::is_signed_v<T> && index == sizeof(T) * 8 - 1
+                                         ? -std::ldexp(1.0, static_cast<int>(index))
+                                         : std::ldexp(1.0, static_cast<int>(index)))) {}
+
+    __m128d check(__m128d x, __m128d) const noexcept { return fits(x); }
+
+    // Where the bit changes, x moves by its weight: up by setWeight where it
+    // is set, down by it where it is cleared.
+    __m128d apply(__m128d x, __m128d v) const noexcept {
+        const __m128i bit =
+            _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
+        const __m128d isSet = _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit));
+        const __m128d changes = _mm_xor_pd(isSet, v);
+        const __m128d signOfClear = _mm_andnot_pd(v, lanes::broadcast(-0.0));
+        return _mm_add_pd(x, _mm_and_pd(changes, _mm_xor_pd(setWeight, signOfClear)));
+    }
+};
+
 // BitsetFtor<T> with an array of double positions and one V for every
 // element, as a lane kernel of the double path's checked loop: BitsetLanes
 // with each lane's own bit index and weight.

@@ -47,12 +47,20 @@ bool setAtPositions(const double* values, const double* positions, bool value, d
                            &runInRanges);
 }
 
+// The same with one position and an array of V, one for each element of A.
+template <class T>
+bool setAtOnePositionByValues(const double* values, double position, const bool* valueData,
+                              double* out, unsigned long n) {
+    if (!bitIsValid(position, bitWidth<T>)) return false;
+    return runCheckedLanes(BitsetValuesLanes<T>(bitIndexOf(position)), values, valueData, out, n,
+                           &runInRanges);
+}
+
 // Validates all of A, then all of BIT, for class T, and fills the result,
 // which exists already. A scalar operand is validated even when the result
 // is empty. In place nothing is written before both have passed, so a
-// refusal leaves A untouched; a fresh result with one V, and one position or
-// an array of them, is tested and written in one pass. V needs no test: it
-// is logical.
+// refusal leaves A untouched; a fresh result with one position or one V (or
+// both) is tested and written in one pass. V needs no test: it is logical.
 template <class T>
 void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool* valueData,
                         zqArray_tag* result, bool scalarA, bool scalarBit, bool scalarValue) {
@@ -64,6 +72,9 @@ void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool
         return;
     if (!scalarA && !scalarBit && scalarValue &&
         setAtPositions<T>(values, positions, *valueData, out, n))
+        return;
+    if (!scalarA && scalarBit && !scalarValue &&
+        setAtOnePositionByValues<T>(values, *positions, valueData, out, n))
         return;
     if (!allFitInteger<T>(values, scalarA ? 1 : n)) raiseError<errors::outOfRange>();
     checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>);

@@ -5,7 +5,9 @@
 // over memory; in place every element is tested before the first is written.
 //
 // A lane kernel has `arity` (1 or 2 array operands, read with unit stride;
-// scalar operands live in the kernel), `parallelLimit`, and
+// scalar operands live in the kernel), `parallelLimit`, optionally `Second`
+// (the element type of the second operand: double unless it says bool, whose
+// elements reach it as lanes of all ones or zeros), and
 //   __m128d check(x[, y]) const: all ones in each lane it accepts;
 //   __m128d apply(x[, y]) const: the result lanes, whatever bits where
 //                                check refuses (never undefined behaviour).
@@ -15,6 +17,7 @@
 #include <xmmintrin.h>
 
 #include <atomic>
+#include <type_traits>
 
 namespace bitfcns {
 
@@ -31,9 +34,30 @@ namespace lane_loop_detail {
 enum class Pass { checkAndApply, checkOnly, applyOnly };
 
 template <class Kernel>
+struct SecondOperand {
+    using type = double;
+};
+template <class Kernel>
+requires requires { typename Kernel::Second; }
+struct SecondOperand<Kernel> {
+    using type = typename Kernel::Second;
+};
+
+// Two elements of the second operand from p, and one (in the low lane).
+inline __m128d twoLanes(const double* p) noexcept { return _mm_loadu_pd(p); }
+inline __m128d oneLane(const double* p) noexcept { return _mm_load_sd(p); }
+inline __m128d twoLanes(const bool* p) noexcept {
+    return _mm_castsi128_pd(
+        _mm_set_epi64x(-static_cast<long long>(p[1]), -static_cast<long long>(p[0])));
+}
+inline __m128d oneLane(const bool* p) noexcept {
+    return _mm_castsi128_pd(_mm_set_epi64x(0, -static_cast<long long>(p[0])));
+}
+
+template <class Kernel>
 struct Run {
     const double* first;
-    const double* second;
+    const typename SecondOperand<Kernel>::type* second;
     double* out;
     Kernel kernel;
     std::atomic<bool>* refused;
@@ -68,7 +92,7 @@ template <class Kernel, Pass pass>
     const Run<Kernel>& run = *static_cast<const Run<Kernel>*>(context);
     // Locals: a store through `out` may not reload them.
     const double* const first = run.first;
-    const double* const second = run.second;
+    const auto* const second = run.second;
     double* const out = run.out;
     const Kernel kernel = run.kernel;
     constexpr bool two = Kernel::arity == 2;
@@ -76,7 +100,7 @@ template <class Kernel, Pass pass>
     __m128d accepted = _mm_castsi128_pd(_mm_set1_epi32(-1));
     const auto pair = [&](unsigned long i) {
         const __m128d x = _mm_loadu_pd(first + i);
-        const __m128d y = two ? _mm_loadu_pd(second + i) : x;
+        const __m128d y = two ? twoLanes(second + i) : x;
         if constexpr (pass != Pass::applyOnly)
             accepted = _mm_and_pd(accepted, checkLanes(kernel, x, y));
         if constexpr (pass != Pass::checkOnly) _mm_storeu_pd(out + i, applyLanes(kernel, x, y));
@@ -86,8 +110,12 @@ template <class Kernel, Pass pass>
     // Head: cache lines of eight elements, each asked for ahead.
     for (; i + 8 <= end; i += 8) {
         _mm_prefetch(reinterpret_cast<const char*>(first + i + prefetchElements), _MM_HINT_T0);
-        if constexpr (two)
-            _mm_prefetch(reinterpret_cast<const char*>(second + i + prefetchElements), _MM_HINT_T0);
+        // A line of logical elements spans eight steps: asked for in one.
+        if constexpr (two) {
+            if (sizeof(*second) == sizeof(double) || (i & 63) < 8)
+                _mm_prefetch(reinterpret_cast<const char*>(second + i + prefetchElements),
+                             _MM_HINT_T0);
+        }
         pair(i);
         pair(i + 2);
         pair(i + 4);
@@ -97,7 +125,7 @@ template <class Kernel, Pass pass>
     // Tail: one element in the low lane; the high lane's answer is ignored.
     if (i < end) {
         const __m128d x = _mm_load_sd(first + i);
-        const __m128d y = two ? _mm_load_sd(second + i) : x;
+        const __m128d y = two ? oneLane(second + i) : x;
         if constexpr (pass != Pass::applyOnly) {
             const __m128d highLane = _mm_castsi128_pd(_mm_set_epi32(-1, -1, 0, 0));
             accepted = _mm_and_pd(accepted, _mm_or_pd(highLane, checkLanes(kernel, x, y)));
@@ -115,14 +143,15 @@ template <class Kernel, Pass pass>
 // first is written, and a refusal leaves it untouched; otherwise one pass
 // tests and writes, and a refusal leaves `out` partly written.
 template <class Kernel>
-bool runCheckedLanes(const Kernel& kernel, const double* first, const double* second, double* out,
-                     unsigned long n, RangeRunner runRanges) {
+bool runCheckedLanes(const Kernel& kernel, const double* first,
+                     const typename lane_loop_detail::SecondOperand<Kernel>::type* second,
+                     double* out, unsigned long n, RangeRunner runRanges) {
     using namespace lane_loop_detail;
     if (n == 0) return true;
     std::atomic<bool> refused{false};
     const Run<Kernel> run{first, second, out, kernel, &refused};
     constexpr unsigned long limit = Kernel::parallelLimit;
-    if (out == first || out == second) {
+    if (out == first || static_cast<const void*>(out) == second) {
         runRanges(n, limit, &runRange<Kernel, Pass::checkOnly>, &run);
         if (refused.load(std::memory_order_relaxed)) return false;
         runRanges(n, limit, &runRange<Kernel, Pass::applyOnly>, &run);

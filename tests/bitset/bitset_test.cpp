@@ -83,7 +83,8 @@ class EveryClass : public ::testing::Test {};
 TYPED_TEST_SUITE(EveryClass, IntegerTypes);
 
 // Doubles at the edges of T, each bit set and cleared: one position for all,
-// then arrays that pair each edge with every position in turn.
+// with one V or an array of them, then arrays that pair each edge with every
+// position in turn.
 TYPED_TEST(EveryClass, DoubleEdgesAtEveryPosition) {
     constexpr double width = sizeof(TypeParam) * 8;
     const std::vector<double> edges = edgeDoublesOf<TypeParam>();
@@ -95,6 +96,11 @@ TYPED_TEST(EveryClass, DoubleEdgesAtEveryPosition) {
             pairedPositions.push_back(p);
         }
     const auto manyValues = makeOf(pairedValues), manyPositions = makeOf(pairedPositions);
+    std::vector<double> mixed(edges.size());  // V for each element: set, clear, clear, ...
+    for (std::size_t i = 0; i < mixed.size(); ++i) mixed[i] = i % 3 == 0;
+    const auto mixedValues = makeOf(mixed);
+    for (double p = 1; p <= width; ++p)
+        expectAsModel({values.get(), scalarOf(p).get(), mixedValues.get(), type.get()});
     for (bool v : {false, true}) {
         const auto value = scalarOf(double(v));
         for (double p = 1; p <= width; ++p)
