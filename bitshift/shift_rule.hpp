@@ -63,6 +63,34 @@ struct bitshiftVVFtor {
         return k > 0 ? shiftLeftWithin(x, k) : shiftRightWithin(x, -k);
     }
 
+    // The rule on a register of each, for an integer U of T's width up to 32
+    // bits (nbits being that width). A count read as unsigned below the
+    // width shifts left; a negative one shifts right by its negation, which
+    // read as unsigned is at or beyond the width also for the count whose
+    // negation wraps. Beyond the width a logical shift gives 0, and an
+    // arithmetic one stops at width - 1, which gives what shiftedOut gives.
+    __m128i lanes(__m128i x, __m128i c) const noexcept requires lanes::SameWidthLanes<T, U> {
+        const __m128i low = lanes::repeat<T>(lanes::bitsOf<T> - 1);
+        const __m128i left = _mm_and_si128(lanes::isBelowWidth<T>(c),
+                                           lanes::shiftLeftEach<T>(x, _mm_and_si128(c, low)));
+        if constexpr (std::is_unsigned_v<U>) {
+            return left;
+        } else {
+            const __m128i r = lanes::subtract<T>(_mm_setzero_si128(), c);
+            const __m128i rBelow = lanes::isBelowWidth<T>(r);
+            __m128i right;
+            if constexpr (std::is_signed_v<T>) {
+                const __m128i k =
+                    _mm_or_si128(_mm_and_si128(r, low), _mm_andnot_si128(rBelow, low));
+                right = lanes::shiftRightArithmeticEach<T>(x, k);
+            } else {
+                right = _mm_and_si128(rBelow,
+                                      lanes::shiftRightLogicalEach<T>(x, _mm_and_si128(r, low)));
+            }
+            return lanes::select(lanes::isNegative<T>(c), right, left);
+        }
+    }
+
 private:
     // -nbits < c < nbits. For a signed count, c + nbits - 1 read as unsigned
     // 64-bit (wrapping) is at most 2 nbits - 2 exactly then.
