@@ -16,6 +16,7 @@
 #include <limits>
 #include <memory>
 #include <mutex>
+#include <numeric>
 #include <random>
 #include <thread>
 #include <utility>
@@ -113,19 +114,15 @@ TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
 }
 
 // Pairs of element types (value, second operand) that have vector forms.
-template <class T, class U>
-struct Pair {
-    using Value = T;
-    using Other = U;
-};
 template <class P>
 class VectorForms : public ::testing::Test {};
-using Pairs = ::testing::Types<Pair<std::uint8_t, std::uint8_t>, Pair<std::uint8_t, std::int8_t>,
-                               Pair<std::int8_t, std::uint8_t>, Pair<std::int8_t, std::int8_t>,
-                               Pair<std::int8_t, bool>, Pair<std::uint16_t, std::int16_t>,
-                               Pair<std::int16_t, std::uint16_t>, Pair<std::int16_t, std::int16_t>,
-                               Pair<std::uint32_t, std::int32_t>, Pair<std::int32_t, std::uint32_t>,
-                               Pair<std::int32_t, std::int32_t>>;
+template <class T, class U>
+using P = std::pair<T, U>;
+using Pairs = ::testing::Types<
+    P<std::uint8_t, std::uint8_t>, P<std::uint8_t, std::int8_t>, P<std::int8_t, std::uint8_t>,
+    P<std::int8_t, std::int8_t>, P<std::int8_t, bool>, P<std::uint16_t, std::int16_t>,
+    P<std::int16_t, std::uint16_t>, P<std::int16_t, std::int16_t>, P<std::uint32_t, std::int32_t>,
+    P<std::int32_t, std::uint32_t>, P<std::int32_t, std::int32_t>>;
 TYPED_TEST_SUITE(VectorForms, Pairs);
 
 // Every pair of 8-bit elements; for wider ones every pair of edge values
@@ -133,12 +130,14 @@ TYPED_TEST_SUITE(VectorForms, Pairs);
 // second operands.
 template <class T, class U>
 void operandPairs(std::vector<T>& a, std::vector<U>& b) {
-    constexpr long w = 8 * sizeof(T);
-    std::vector<long> edges{0, 1, 2, -1, w - 1, w, w + 1, 1 - w, -w, -w - 1};
-    for (long e : {long(std::numeric_limits<T>::min()), long(std::numeric_limits<T>::max())})
-        edges.insert(edges.end(), {e, e + 1, e - 1});
-    if constexpr (sizeof(T) == 1) edges.resize(0);
-    for (long x = 0; x < (sizeof(T) == 1 ? 256 : 0); ++x) edges.push_back(x);
+    constexpr long w = 8 * sizeof(T), min = std::numeric_limits<T>::min(),
+                   max = std::numeric_limits<T>::max();
+    std::vector<long> edges{0,     1,  2,      -1,  w - 1,   w,       w + 1,
+                            1 - w, -w, -w - 1, min, min + 1, max - 1, max};
+    if (w == 8) {
+        edges.resize(256);
+        std::iota(edges.begin(), edges.end(), 0l);
+    }
     for (long x : edges)
         for (long y : edges) a.push_back(static_cast<T>(x)), b.push_back(static_cast<U>(y));
     std::mt19937_64 random(13);
@@ -167,8 +166,8 @@ void expectLanesMatchScalar(const char* name, const Ftor& ftor, const std::vecto
 }
 
 TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
-    using T = typename TypeParam::Value;
-    using U = typename TypeParam::Other;
+    using T = typename TypeParam::first_type;
+    using U = typename TypeParam::second_type;
     constexpr std::uint32_t w = 8 * sizeof(T);
     // Logicals are stored as bytes of 0 or 1, as the host holds them.
     using S = std::conditional_t<std::is_same_v<U, bool>, unsigned char, U>;
@@ -191,7 +190,7 @@ TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
 // output and both inputs, in place or not, at lengths around multiples of a
 // register and a cache line, nothing written outside the result; and a
 // split run.
-TEST(VectorForms, RecordRunsAtEveryPlacementMatchTheScalarFunctor) {
+TEST(VectorLoop, RunsAtEveryPlacementMatchTheScalarFunctor) {
     using T = std::int8_t;
     using Record = bitfcnsTwoInputVectorOp<T, T, bitshiftVVFtor<T, T>>;
     const bitshiftVVFtor<T, T> ftor{8};
