@@ -64,29 +64,20 @@ struct bitshiftVVFtor {
     }
 
     // The rule on a register of each, for an integer U of T's width up to 32
-    // bits (nbits being that width). A count read as unsigned below the
-    // width shifts left; a negative one shifts right by its negation, which
-    // read as unsigned is at or beyond the width also for the count whose
-    // negation wraps. Beyond the width a logical shift gives 0, and an
-    // arithmetic one stops at width - 1, which gives what shiftedOut gives.
+    // bits (nbits being that width). With k the low bits of the count, a
+    // count from 0 to width - 1 shifts left by k; one from -width to -1
+    // right by -c, that is by width - k; one below -width shifts out.
     __m128i lanes(__m128i x, __m128i c) const noexcept requires lanes::SameWidthLanes<T, U> {
-        const __m128i low = lanes::repeat<T>(lanes::bitsOf<T> - 1);
-        const __m128i left = _mm_and_si128(lanes::isBelowWidth<T>(c),
-                                           lanes::shiftLeftEach<T>(x, _mm_and_si128(c, low)));
+        const __m128i k = _mm_and_si128(c, lanes::repeat<T>(lanes::bitsOf<T> - 1));
+        const lanes::ShiftedBothWays shifted = lanes::shiftBothWaysEach<T>(x, k);
+        const __m128i left = _mm_and_si128(lanes::isBelowWidth<T>(c), shifted.left);
         if constexpr (std::is_unsigned_v<U>) {
             return left;
         } else {
-            const __m128i r = lanes::subtract<T>(_mm_setzero_si128(), c);
-            const __m128i rBelow = lanes::isBelowWidth<T>(r);
-            __m128i right;
-            if constexpr (std::is_signed_v<T>) {
-                const __m128i k =
-                    _mm_or_si128(_mm_and_si128(r, low), _mm_andnot_si128(rBelow, low));
-                right = lanes::shiftRightArithmeticEach<T>(x, k);
-            } else {
-                right = _mm_and_si128(rBelow,
-                                      lanes::shiftRightLogicalEach<T>(x, _mm_and_si128(r, low)));
-            }
+            const __m128i out = lanes::isLess<T>(c, lanes::repeat<T>(0u - lanes::bitsOf<T>));
+            const __m128i right = std::is_signed_v<T>
+                                      ? lanes::select(out, lanes::isNegative<T>(x), shifted.right)
+                                      : _mm_andnot_si128(out, shifted.right);
             return lanes::select(lanes::isNegative<T>(c), right, left);
         }
     }

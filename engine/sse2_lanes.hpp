@@ -143,19 +143,24 @@ __m128i subtract(__m128i a, __m128i b) noexcept {
     }
 }
 
-// All ones in each lane that is negative as a signed number. 8, 16 and
+// All ones in each lane where a is less than b, both signed. 8, 16 and
 // 32-bit lanes.
 template <class T>
-__m128i isNegative(__m128i v) noexcept {
+__m128i isLess(__m128i a, __m128i b) noexcept {
     static_assert(sizeof(T) <= 4, "SSE2 has no compare of 64-bit lanes");
-    const __m128i zero = _mm_setzero_si128();
     if constexpr (sizeof(T) == 1) {
-        return _mm_cmplt_epi8(v, zero);
+        return _mm_cmplt_epi8(a, b);
     } else if constexpr (sizeof(T) == 2) {
-        return _mm_cmplt_epi16(v, zero);
+        return _mm_cmplt_epi16(a, b);
     } else {
-        return _mm_cmplt_epi32(v, zero);
+        return _mm_cmplt_epi32(a, b);
     }
+}
+
+// All ones in each lane that is negative as a signed number.
+template <class T>
+__m128i isNegative(__m128i v) noexcept {
+    return isLess<T>(v, _mm_setzero_si128());
 }
 
 // All ones in each lane that, read as unsigned, is below T's width.
@@ -257,6 +262,52 @@ __m128i shiftRightArithmeticEach(__m128i v, __m128i k) noexcept {
         return _mm_xor_si128(shiftRightLogicalEach<T>(_mm_xor_si128(v, sign), k), sign);
     } else {
         return shiftEach<T, Shift::rightArithmetic>(v, k, CountBits<T>{});
+    }
+}
+
+// Arithmetic for signed T, logical for unsigned T.
+template <class T>
+__m128i shiftRightEach(__m128i v, __m128i k) noexcept {
+    if constexpr (std::is_signed_v<T>) {
+        return shiftRightArithmeticEach<T>(v, k);
+    } else {
+        return shiftRightLogicalEach<T>(v, k);
+    }
+}
+
+// Each lane shifted left by its count k and, apart, right by width - k
+// (arithmetically for signed T, logically for unsigned T), every count in
+// [0, width): a right shift by the whole width leaves the lane's sign fill.
+struct ShiftedBothWays {
+    __m128i left;
+    __m128i right;
+};
+template <class T>
+ShiftedBothWays shiftBothWaysEach(__m128i v, __m128i k) noexcept {
+    if constexpr (sizeof(T) == 1) {
+        // One product per byte gives both: the byte extended as T to 16 bits
+        // times 2^k has the byte shifted left by k in its low half and
+        // shifted right by 8 - k in its high half. Even bytes are multiplied
+        // in the low halves of the 16-bit lanes, odd ones in the high halves.
+        using namespace each_detail;
+        const __m128i one = _mm_set1_epi8(1);
+        __m128i power = _mm_sub_epi8(one, whereBitSet<T, 0>(k));
+        power = select(whereBitSet<T, 1>(k), _mm_slli_epi16(power, 2), power);  // at most 8
+        power = select(whereBitSet<T, 2>(k), _mm_slli_epi16(power, 4), power);
+        const __m128i low = _mm_set1_epi16(0x00FF);
+        const __m128i even =
+            std::is_signed_v<T> ? _mm_srai_epi16(_mm_slli_epi16(v, 8), 8) : _mm_and_si128(v, low);
+        const __m128i odd = std::is_signed_v<T> ? _mm_srai_epi16(v, 8) : _mm_srli_epi16(v, 8);
+        const __m128i evenProduct = _mm_mullo_epi16(even, _mm_and_si128(power, low));
+        const __m128i oddProduct = _mm_mullo_epi16(odd, _mm_srli_epi16(power, 8));
+        return {_mm_or_si128(_mm_and_si128(evenProduct, low), _mm_slli_epi16(oddProduct, 8)),
+                _mm_or_si128(_mm_srli_epi16(evenProduct, 8), _mm_andnot_si128(low, oddProduct))};
+    } else {
+        // By width - k as by 1, then by width - 1 - k, which is k's low bits
+        // inverted.
+        const __m128i fromTop = _mm_xor_si128(k, repeat<T>(bitsOf<T> - 1));
+        return {shiftLeftEach<T>(v, k),
+                shiftRightEach<T>(shiftRight<T>(v, countRegister(1)), fromTop)};
     }
 }
 
