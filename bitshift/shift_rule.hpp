@@ -13,6 +13,7 @@
 #include "frame/element_scan.hpp"
 #include "frame/integer_conversion.hpp"
 
+#include <cassert>
 #include <cmath>
 #include <cstdint>
 #include <type_traits>
@@ -68,6 +69,7 @@ struct bitshiftVVFtor {
     // count from 0 to width - 1 shifts left by k; one from -width to -1
     // right by -c, that is by width - k; one below -width shifts out.
     __m128i lanes(__m128i x, __m128i c) const noexcept requires lanes::SameWidthLanes<T, U> {
+        assert(nbits == static_cast<int>(lanes::bitsOf<T>));
         const __m128i k = _mm_and_si128(c, lanes::repeat<T>(lanes::bitsOf<T> - 1));
         const lanes::ShiftedBothWays shifted = lanes::shiftBothWaysEach<T>(x, k);
         const __m128i left = _mm_and_si128(lanes::isBelowWidth<T>(c), shifted.left);
