@@ -96,7 +96,8 @@ struct BitgetPositionsLanes {
 
 // a of class T, p a position of class U from 1 to T's width (tested
 // before): bit p - 1 of a. An integer p is widened like T's elements, a
-// single or double p truncated to an integer first.
+// single or double p truncated to an integer first. lanes() reads a
+// register of each where U is an integer class of T's width, up to 32 bits.
 template <class T, class U>
 struct bitgetVVFtor {
     static constexpr unsigned long parallelLimit = limits::bitgetPositionArray;
@@ -107,6 +108,11 @@ struct bitgetVVFtor {
         } else {
             return bitOf(a, static_cast<std::uint64_t>(static_cast<Widened<U>>(p) - 1));
         }
+    }
+
+    __m128i lanes(__m128i a, __m128i p) const noexcept requires lanes::SameWidthLanes<T, U> {
+        const __m128i one = lanes::repeat<T>(1);
+        return _mm_and_si128(lanes::shiftRightLogicalEach<T>(a, lanes::subtract<T>(p, one)), one);
     }
 };
 

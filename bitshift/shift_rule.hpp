@@ -15,6 +15,7 @@
 #include "frame/element_scan.hpp"
 #include "frame/integer_conversion.hpp"
 
+#include <cassert>
 #include <cmath>
 #include <cstdint>
 #include <type_traits>
@@ -63,6 +64,26 @@ struct bitshiftVVFtor {
         if (!withinWidth(c)) return shiftedOut(x, c);
         const int k = static_cast<int>(c);
         return k > 0 ? shiftLeftWithin(x, k) : shiftRightWithin(x, -k);
+    }
+
+    // The rule on a register of each, for an integer U of T's width up to 32
+    // bits (nbits being that width). With k the low bits of the count, a
+    // count from 0 to width - 1 shifts left by k; one from -width to -1
+    // right by -c, that is by width - k; one below -width shifts out.
+    __m128i lanes(__m128i x, __m128i c) const noexcept requires lanes::SameWidthLanes<T, U> {
+        assert(nbits == static_cast<int>(lanes::bitsOf<T>));
+        const __m128i k = _mm_and_si128(c, lanes::repeat<T>(lanes::bitsOf<T> - 1));
+        const lanes::ShiftedBothWays shifted = lanes::shiftBothWaysEach<T>(x, k);
+        const __m128i left = _mm_and_si128(lanes::isBelowWidth<T>(c), shifted.left);
+        if constexpr (std::is_unsigned_v<U>) {
+            return left;
+        } else {
+            const __m128i out = lanes::isLess<T>(c, lanes::repeat<T>(0u - lanes::bitsOf<T>));
+            const __m128i right = std::is_signed_v<T>
+                                      ? lanes::select(out, lanes::isNegative<T>(x), shifted.right)
+                                      : _mm_andnot_si128(out, shifted.right);
+            return lanes::select(lanes::isNegative<T>(c), right, left);
+        }
     }
 
 private:

@@ -84,8 +84,16 @@ struct IntBitorFtor {
 
 namespace bitfcns {
 
+// Each lane of a with the bits of `mask` set where v's lane is not zero and
+// cleared where it is, without a branch. 8, 16 and 32-bit lanes.
+template <class T>
+__m128i setWhereNonZero(__m128i a, __m128i v, __m128i mask) noexcept {
+    const __m128i isZero = lanes::isZero<T>(v);
+    return _mm_or_si128(_mm_andnot_si128(mask, a), _mm_andnot_si128(isZero, mask));
+}
+
 // in1 with bit `bitIndex` set where in2 is not zero and cleared where it is
-// zero, without a branch. 8, 16 and 32-bit elements.
+// zero. 8, 16 and 32-bit elements.
 class IntBitsetSSE2Ftor {
 public:
     template <class T>
@@ -98,11 +106,7 @@ public:
         assert(belowWidth<T>(bitIndex_));
         const __m128i mask = lanes::repeat<T>(1u << bitIndex_);
         return [mask](__m128i in1, __m128i in2) noexcept {
-            const __m128i isZero = lanes::isZero<T>(in2);
-            // NOT(z AND mask) AND ((NOT z AND mask) OR in1)
-            const __m128i clearBits = _mm_and_si128(isZero, mask);
-            const __m128i setBits = _mm_andnot_si128(isZero, mask);
-            return _mm_andnot_si128(clearBits, _mm_or_si128(setBits, in1));
+            return setWhereNonZero<T>(in1, in2, mask);
         };
     }
 
@@ -111,7 +115,9 @@ private:
 };
 // a with bit `bitIndex` set if v is not zero (in W's own type), cleared if it
 // is. W is T in the vector pair; bitset also uses it with other value types,
-// and for 64-bit T, in the plain two-input operator with this limit.
+// and for 64-bit T, in the plain two-input operator with this limit. Where W
+// is an integer or logical type of T's width, up to 32 bits, lanes() does
+// the same to a register of each; a logical is not zero where its byte isn't.
 template <class T, class W>
 class IntBitsetFtor {
 public:
@@ -126,6 +132,10 @@ public:
         const Mask mask = Mask{1} << bitIndex_;
         const Mask bits = static_cast<Mask>(a);
         return static_cast<T>(v != W{} ? (bits | mask) : (bits & ~mask));
+    }
+
+    __m128i lanes(__m128i a, __m128i v) const noexcept requires lanes::SameWidthLanes<T, W> {
+        return setWhereNonZero<T>(a, v, lanes::repeat<T>(1u << bitIndex_));
     }
 
 private:

@@ -1,15 +1,23 @@
 // The parallel driver: one serial call on the calling thread below its limit,
-// subranges covering the run exactly once from it; and the plain records,
-// whose elements are the same in one serial call and split down to single
-// elements, with every input broadcast or not.
+// subranges covering the run exactly once from it; the plain records, whose
+// elements are the same in one serial call and split down to single
+// elements, with every input broadcast or not; and the vector forms of the
+// plain functors, lane for lane against their scalar operator(), alone and
+// through a record at every placement.
 #include "engine/vector_ops.hpp"
+#include "bitget/bitget_ftors.hpp"
+#include "bitshift/shift_rule.hpp"
 
 #include <gtest/gtest.h>
 #include <tbb/task_arena.h>
 
 #include <algorithm>
+#include <cstdint>
+#include <limits>
 #include <memory>
 #include <mutex>
+#include <numeric>
+#include <random>
 #include <thread>
 #include <utility>
 #include <vector>
@@ -103,6 +111,115 @@ TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
                 ASSERT_EQ(three[i], WeightedSum{}(a[i * s1], b[i * s2], flags[i * s3])) << i;
             }
         }
+}
+
+// Pairs of element types (value, second operand) that have vector forms.
+template <class P>
+class VectorForms : public ::testing::Test {};
+template <class T, class U>
+using P = std::pair<T, U>;
+using Pairs = ::testing::Types<
+    P<std::uint8_t, std::uint8_t>, P<std::uint8_t, std::int8_t>, P<std::int8_t, std::uint8_t>,
+    P<std::int8_t, std::int8_t>, P<std::int8_t, bool>, P<std::uint16_t, std::int16_t>,
+    P<std::int16_t, std::uint16_t>, P<std::int16_t, std::int16_t>, P<std::uint32_t, std::int32_t>,
+    P<std::int32_t, std::uint32_t>, P<std::int32_t, std::int32_t>>;
+TYPED_TEST_SUITE(VectorForms, Pairs);
+
+// Every pair of 8-bit elements; for wider ones every pair of edge values
+// and counts around the width, then random pairs, half of them with small
+// second operands.
+template <class T, class U>
+void operandPairs(std::vector<T>& a, std::vector<U>& b) {
+    constexpr long w = 8 * sizeof(T), min = std::numeric_limits<T>::min(),
+                   max = std::numeric_limits<T>::max();
+    std::vector<long> edges{0,     1,  2,      -1,  w - 1,   w,       w + 1,
+                            1 - w, -w, -w - 1, min, min + 1, max - 1, max};
+    if (w == 8) {
+        edges.resize(256);
+        std::iota(edges.begin(), edges.end(), 0l);
+    }
+    for (long x : edges)
+        for (long y : edges) a.push_back(static_cast<T>(x)), b.push_back(static_cast<U>(y));
+    std::mt19937_64 random(13);
+    while (a.size() % 16 != 0 || (sizeof(T) > 1 && a.size() < 20000)) {
+        a.push_back(static_cast<T>(random()));
+        const auto r = random();
+        b.push_back(static_cast<U>(r % 2 ? r : r % (4 * w) - 2 * w));
+    }
+}
+
+// ftor.lanes(a, b) against ftor(a[i], b[i]) in every lane, b's elements
+// stored as S and passed to operator() as U.
+template <class U, class T, class S, class Ftor>
+void expectLanesMatchScalar(const char* name, const Ftor& ftor, const std::vector<T>& a,
+                            const std::vector<S>& b) {
+    constexpr unsigned long count = 16 / sizeof(T);
+    T results[count];
+    for (unsigned long i = 0; i < a.size(); i += count) {
+        const __m128i va = _mm_loadu_si128(reinterpret_cast<const __m128i*>(a.data() + i));
+        const __m128i vb = _mm_loadu_si128(reinterpret_cast<const __m128i*>(b.data() + i));
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(results), ftor.lanes(va, vb));
+        for (unsigned long k = 0; k < count; ++k)
+            ASSERT_EQ(results[k], ftor(a[i + k], static_cast<U>(b[i + k])))
+                << name << "(" << +a[i + k] << ", " << +b[i + k] << ")";
+    }
+}
+
+TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
+    using T = typename TypeParam::first_type;
+    using U = typename TypeParam::second_type;
+    constexpr std::uint32_t w = 8 * sizeof(T);
+    // Logicals are stored as bytes of 0 or 1, as the host holds them.
+    using S = std::conditional_t<std::is_same_v<U, bool>, unsigned char, U>;
+    std::vector<T> a;
+    std::vector<S> b;
+    operandPairs(a, b);
+    if constexpr (std::is_same_v<U, bool>)
+        for (S& v : b) v = v & 1;
+    for (std::uint32_t bit = 0; bit < w; ++bit)
+        expectLanesMatchScalar<U>("bitset", IntBitsetFtor<T, U>(bit), a, b);
+    if constexpr (!std::is_same_v<U, bool>) {
+        expectLanesMatchScalar<U>("bitshift", bitshiftVVFtor<T, U>{int(w)}, a, b);
+        std::vector<U> positions(b.size());
+        for (unsigned long i = 0; i < b.size(); ++i) positions[i] = static_cast<U>(1 + b[i] % w);
+        expectLanesMatchScalar<U>("bitget", bitgetVVFtor<T, U>{}, a, positions);
+    }
+}
+
+// The vector loop of a two-input record: every offset within a register of
+// output and both inputs, in place or not, at lengths around multiples of a
+// register and a cache line, nothing written outside the result; and a
+// split run.
+TEST(VectorLoop, RunsAtEveryPlacementMatchTheScalarFunctor) {
+    using T = std::int8_t;
+    using Record = bitfcnsTwoInputVectorOp<T, T, bitshiftVVFtor<T, T>>;
+    const bitshiftVVFtor<T, T> ftor{8};
+    std::vector<T> a, b;
+    operandPairs(a, b);
+    constexpr unsigned long room = 200;
+    const T sentinel = 0x5A;
+    std::vector<T> out(room), in1(room), in2(room);
+    for (unsigned long n : {0, 1, 15, 16, 17, 31, 33, 63, 64, 65, 79, 130})
+        for (unsigned long form = 0; form < 2 * 16 * 16 * 16; ++form) {
+            const unsigned long oo = form % 16, o1 = form / 16 % 16, o2 = form / 256 % 16;
+            const bool inPlace = form >= 16 * 16 * 16;
+            if (inPlace && o1 != oo) continue;
+            const unsigned long from = (form * 97) % (a.size() - n);
+            std::fill(out.begin(), out.end(), sentinel);
+            T* const x = (inPlace ? out : in1).data() + o1;
+            std::copy_n(a.begin() + from, n, x);
+            std::copy_n(b.begin() + from, n, in2.data() + o2);
+            runWithLimit(Record{x, in2.data() + o2, out.data() + oo, 1, 1, n, ftor}, n + 1);
+            for (unsigned long i = 0; i < room; ++i) {
+                const unsigned long k = i - oo;
+                ASSERT_EQ(out[i], i >= oo && k < n ? ftor(a[from + k], b[from + k]) : sentinel)
+                    << "element " << i << ", n " << n << ", out@" << oo << ", in@" << o1 << "/"
+                    << o2 << (inPlace ? ", in place" : "");
+            }
+        }
+    std::vector<T> split(a.size());
+    runWithLimit(Record{a.data(), b.data(), split.data(), 1, 1, a.size(), ftor}, 1);
+    for (unsigned long i = 0; i < a.size(); ++i) ASSERT_EQ(split[i], ftor(a[i], b[i])) << i;
 }
 
 }  // namespace
