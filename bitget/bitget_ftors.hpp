@@ -63,10 +63,8 @@ struct BitgetLanes {
     __m128d check(__m128d x) const noexcept { return fits(x); }
 
     __m128d apply(__m128d x) const noexcept {
-        const __m128i bit =
-            _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
-        return _mm_and_pd(_mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit)),
-                          lanes::broadcast(1.0));
+        const __m128d isSet = lanes::lowBitMask(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex));
+        return _mm_and_pd(isSet, lanes::broadcast(1.0));
     }
 };
 
@@ -87,10 +85,9 @@ struct BitgetPositionsLanes {
 
     __m128d apply(__m128d x, __m128d p) const noexcept {
         const __m128i index = lanes::countLanes(_mm_sub_pd(p, lanes::broadcast(1.0)));
-        const __m128i bit = _mm_and_si128(lanes::shiftRightEach64(lanes::patternOf<T>(x), index),
-                                          lanes::broadcast64(1));
-        return _mm_and_pd(_mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit)),
-                          lanes::broadcast(1.0));
+        const __m128d isSet =
+            lanes::lowBitMask(lanes::shiftRightEach64(lanes::patternOf<T>(x), index));
+        return _mm_and_pd(isSet, lanes::broadcast(1.0));
     }
 };
 

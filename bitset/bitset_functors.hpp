@@ -125,9 +125,7 @@ struct BitsetLanes {
     __m128d check(__m128d x) const noexcept { return fits(x); }
 
     __m128d apply(__m128d x) const noexcept {
-        const __m128i bit =
-            _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
-        const __m128d isSet = _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit));
+        const __m128d isSet = lanes::lowBitMask(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex));
         const __m128d addend = set ? _mm_andnot_pd(isSet, change) : _mm_and_pd(isSet, change);
         return _mm_add_pd(x, addend);
     }
@@ -157,9 +155,7 @@ struct BitsetValuesLanes {
     // Where the bit changes, x moves by its weight: up by setWeight where it
     // is set, down by it where it is cleared.
     __m128d apply(__m128d x, __m128d v) const noexcept {
-        const __m128i bit =
-            _mm_and_si128(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex), lanes::broadcast64(1));
-        const __m128d isSet = _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit));
+        const __m128d isSet = lanes::lowBitMask(_mm_srl_epi64(lanes::patternOf<T>(x), bitIndex));
         const __m128d changes = _mm_xor_pd(isSet, v);
         const __m128d signOfClear = _mm_andnot_pd(v, lanes::broadcast(-0.0));
         return _mm_add_pd(x, _mm_and_pd(changes, _mm_xor_pd(setWeight, signOfClear)));
@@ -183,10 +179,8 @@ struct BitsetPositionsLanes {
 
     __m128d apply(__m128d x, __m128d b) const noexcept {
         const __m128d index = _mm_sub_pd(b, lanes::broadcast(1.0));
-        const __m128i bit =
-            _mm_and_si128(lanes::shiftRightEach64(lanes::patternOf<T>(x), lanes::countLanes(index)),
-                          lanes::broadcast64(1));
-        const __m128d isSet = _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), bit));
+        const __m128d isSet = lanes::lowBitMask(
+            lanes::shiftRightEach64(lanes::patternOf<T>(x), lanes::countLanes(index)));
         // The weight is negative where the sign bit of a signed T is set, or
         // another bit cleared.
         __m128d negative = _mm_setzero_pd();

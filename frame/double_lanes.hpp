@@ -140,6 +140,12 @@ inline __m128i shiftRightEach64(__m128i v, __m128i counts) noexcept {
     return _mm_castpd_si128(_mm_move_sd(_mm_castsi128_pd(high), _mm_castsi128_pd(low)));
 }
 
+// All ones in each 64-bit lane of v whose lowest bit is set, zeros elsewhere:
+// the bit that a pattern shifted right by an index brings down, as a mask.
+inline __m128d lowBitMask(__m128i v) noexcept {
+    return _mm_castsi128_pd(_mm_sub_epi64(_mm_setzero_si128(), _mm_and_si128(v, broadcast64(1))));
+}
+
 // a where `mask` is all ones, b where it is zero.
 inline __m128d select(__m128d mask, __m128d a, __m128d b) noexcept {
     return _mm_or_pd(_mm_and_pd(mask, a), _mm_andnot_pd(mask, b));
