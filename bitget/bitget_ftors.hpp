@@ -6,6 +6,7 @@
 // bit being position 1.
 #pragma once
 
+#include "engine/lane_operands.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine/simd_functors.hpp"
 #include "frame/class_types.hpp"
@@ -93,11 +94,12 @@ struct BitgetPositionsLanes {
 
 // a of class T, p a position of class U from 1 to T's width (tested
 // before): bit p - 1 of a. An integer p is widened like T's elements, a
-// single or double p truncated to an integer first. lanes() reads a
-// register of each where U is an integer class of T's width, up to 32 bits.
+// single or double p truncated to an integer first. lanes() does the same
+// to a register of T of up to 32 bits, with the positions in its lanes.
 template <class T, class U>
 struct bitgetVVFtor {
     static constexpr unsigned long parallelLimit = limits::bitgetPositionArray;
+    static constexpr lanes::Reading secondOperand = lanes::Reading::position;
 
     T operator()(T a, U p) const noexcept {
         if constexpr (std::is_floating_point_v<U>) {
@@ -107,9 +109,10 @@ struct bitgetVVFtor {
         }
     }
 
-    __m128i lanes(__m128i a, __m128i p) const noexcept requires lanes::SameWidthLanes<T, U> {
+    __m128i lanes(__m128i a, __m128i p) const noexcept requires lanes::RegisterLanes<T> {
         const __m128i one = lanes::repeat<T>(1);
-        return _mm_and_si128(lanes::shiftRightLogicalEach<T>(a, lanes::subtract<T>(p, one)), one);
+        const __m128i bit = lanes::powerOfTwoEach<T>(lanes::subtract<T>(p, one));
+        return _mm_andnot_si128(lanes::isZero<T>(_mm_and_si128(a, bit)), one);
     }
 };
 

@@ -10,7 +10,9 @@
 // again here and no shift reaches the width of its mask.
 #pragma once
 
+#include "engine/lane_operands.hpp"
 #include "engine/parallel_limits.hpp"
+#include "engine/sse2_lanes.hpp"
 #include "frame/class_types.hpp"
 #include "frame/double_lanes.hpp"
 #include "frame/element_scan.hpp"
@@ -72,20 +74,37 @@ struct bitsetVVVFtor {
     }
 };
 
-// a with bit b set: an array of BIT with one true V, or with none.
+// The mask of bit b - 1 in each lane of T, b a valid position in the lane.
+template <class T>
+__m128i maskLanes(__m128i b) noexcept {
+    return lanes::powerOfTwoEach<T>(lanes::subtract<T>(b, lanes::repeat<T>(1)));
+}
+
+// a with bit b set: an array of BIT with one true V, or with none. lanes()
+// does the same to a register of T of up to 32 bits.
 template <class T, class U>
 struct bitsetVVTFtor {
     static constexpr unsigned long parallelLimit = limits::bitsetPositionArrayTrue;
+    static constexpr lanes::Reading secondOperand = lanes::Reading::position;
 
     T operator()(T a, U b) const noexcept { return withMask(a, maskAt<T>(bitIndexOf(b)), true); }
+
+    __m128i lanes(__m128i a, __m128i b) const noexcept requires lanes::RegisterLanes<T> {
+        return _mm_or_si128(a, maskLanes<T>(b));
+    }
 };
 
-// a with bit b cleared: an array of BIT with one false V.
+// a with bit b cleared: an array of BIT with one false V. lanes() as above.
 template <class T, class U>
 struct bitsetVVFFtor {
     static constexpr unsigned long parallelLimit = limits::bitsetPositionArrayFalse;
+    static constexpr lanes::Reading secondOperand = lanes::Reading::position;
 
     T operator()(T a, U b) const noexcept { return withMask(a, maskAt<T>(bitIndexOf(b)), false); }
+
+    __m128i lanes(__m128i a, __m128i b) const noexcept requires lanes::RegisterLanes<T> {
+        return _mm_andnot_si128(maskLanes<T>(b), a);
+    }
 };
 
 // A double a, taken for the integer of class T that it holds (tested

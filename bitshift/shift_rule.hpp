@@ -8,6 +8,7 @@
 #pragma once
 
 #include "bitshift/count_validation.hpp"
+#include "engine/lane_operands.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine/simd_functors.hpp"
 #include "frame/class_types.hpp"
@@ -57,6 +58,7 @@ T shiftedOut(T x, U c) noexcept {
 template <class T, class U>
 struct bitshiftVVFtor {
     static constexpr unsigned long parallelLimit = limits::bitshiftCountArray;
+    static constexpr lanes::Reading secondOperand = lanes::Reading::count;
 
     int nbits;  // the width of T
 
@@ -66,11 +68,12 @@ struct bitshiftVVFtor {
         return k > 0 ? shiftLeftWithin(x, k) : shiftRightWithin(x, -k);
     }
 
-    // The rule on a register of each, for an integer U of T's width up to 32
-    // bits (nbits being that width). With k the low bits of the count, a
-    // count from 0 to width - 1 shifts left by k; one from -width to -1
-    // right by -c, that is by width - k; one below -width shifts out.
-    __m128i lanes(__m128i x, __m128i c) const noexcept requires lanes::SameWidthLanes<T, U> {
+    // The rule on a register of T of up to 32 bits (nbits being its width),
+    // the counts saturated into its lanes (signed, but for an unsigned U).
+    // With k the low bits of the count, a count from 0 to width - 1 shifts
+    // left by k; one from -width to -1 right by -c, that is by width - k;
+    // one below -width shifts out.
+    __m128i lanes(__m128i x, __m128i c) const noexcept requires lanes::RegisterLanes<T> {
         assert(nbits == static_cast<int>(lanes::bitsOf<T>));
         const __m128i k = _mm_and_si128(c, lanes::repeat<T>(lanes::bitsOf<T> - 1));
         const lanes::ShiftedBothWays shifted = lanes::shiftBothWaysEach<T>(x, k);

@@ -9,17 +9,21 @@
 //
 // A functor may also offer a vector form, `lanes(__m128i, __m128i)`, that
 // computes in every lane of a register what operator() computes for one
-// element. A contiguous run of two inputs whose elements and result all
-// have one width of 8, 16 or 32 bits then goes 16 bytes a step through it,
-// and finishes with operator() on the tail.
+// element, with `secondOperand`, the way its second operand is read into
+// the lanes. A contiguous run of two inputs whose first input and result
+// are of one integer class of 8, 16 or 32 bits then goes a register of the
+// first input a step through it, the second operand of any class read into
+// lanes of the same width, and finishes with operator() on the tail.
 #pragma once
 
+#include "engine/lane_operands.hpp"
 #include "engine/prefetch.hpp"
 #include "engine/sse2_lanes.hpp"
 
 #include <emmintrin.h>
 
 #include <algorithm>
+#include <concepts>
 #include <type_traits>
 
 namespace bitfcns::plain_detail {
@@ -67,20 +71,28 @@ void elementLoop(Out* out, unsigned long begin, unsigned long end, Ftor ftor,
     for (; i < end; ++i) out[i] = ftor(inputs.at(i)...);
 }
 
-// A functor with a vector form for two inputs of these element types and a
-// result of Out. (The register type carries an attribute that a template
-// argument would drop, so the form's result is checked where it is stored.)
-template <class Ftor, class Out, class... In>
-concept HasVectorForm = sizeof...(In) == 2 && (lanes::SameWidthLanes<Out, In> && ...) &&
-                        requires(const Ftor& ftor, __m128i a, __m128i b, __m128i* to) {
+// A functor with a vector form for a first input of Out, the result's
+// class, and a second of In2. (The register type carries an attribute that
+// a template argument would drop, so the form's result is checked where it
+// is stored.)
+template <class Ftor, class Out, class In1, class In2>
+concept VectorFormOf = std::is_same_v<Out, In1> && lanes::RegisterLanes<Out> &&
+                       requires(const Ftor& ftor, __m128i a, __m128i b, __m128i* to) {
+    { Ftor::secondOperand } -> std::convertible_to<lanes::Reading>;
     _mm_storeu_si128(to, ftor.lanes(a, b));
 };
+template <class Ftor, class Out, class... In>
+inline constexpr bool hasVectorForm = false;
+template <class Ftor, class Out, class In1, class In2>
+requires VectorFormOf<Ftor, Out, In1, In2>
+inline constexpr bool hasVectorForm<Ftor, Out, In1, In2> = true;
 
-// The contiguous loop of a functor with a vector form: a register of each
-// input a step, in blocks of one cache line with the prefetches at the
-// start of each block, then the elements of the tail one by one. Loads and
-// stores are unaligned; an in-place result reads each register before it
-// writes it.
+// The contiguous loop of a functor with a vector form: a register of the
+// first input a step, and the second's elements for it read into lanes of
+// the same width, in blocks of one cache line of the first input with the
+// prefetches of both at the start of each block, then the elements of the
+// tail one by one. Loads and stores are unaligned; an in-place result reads
+// each register before it writes it.
 template <class Out, class Ftor, class In1, class In2>
 void vectorLoop(Out* out, unsigned long begin, unsigned long end, Ftor ftor, const In1* in1,
                 const In2* in2) noexcept {
@@ -88,14 +100,15 @@ void vectorLoop(Out* out, unsigned long begin, unsigned long end, Ftor ftor, con
     constexpr unsigned long block = cacheLineBytes / sizeof(Out);
     const auto step = [&](unsigned long i) noexcept {
         const __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(in1 + i));
-        const __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(in2 + i));
+        const __m128i b = lanes::readLanesOf<Out, Ftor::secondOperand>(in2 + i);
         _mm_storeu_si128(reinterpret_cast<__m128i*>(out + i), ftor.lanes(a, b));
     };
     unsigned long i = begin;
     // Blocks.
     for (; end - i >= block; i += block) {
         prefetchAhead(in1 + i);
-        prefetchAhead(in2 + i);
+        for (unsigned long line = 0; line < block * sizeof(In2); line += cacheLineBytes)
+            prefetchAhead(reinterpret_cast<const char*>(in2 + i) + line);
         for (unsigned long k = 0; k != block; k += perRegister) step(i + k);
     }
     // Single registers.
@@ -111,7 +124,7 @@ void runElements(Out* out, unsigned long begin, unsigned long end, Ftor ftor,
     const bool allContiguous = (true && ... && (inputs.stride == 1));
     if (!allContiguous) {
         elementLoop(out, begin, end, ftor, inputs...);
-    } else if constexpr (HasVectorForm<Ftor, Out, T...>) {
+    } else if constexpr (hasVectorForm<Ftor, Out, T...>) {
         vectorLoop(out, begin, end, ftor, inputs.p...);
     } else {
         elementLoop(out, begin, end, ftor, ContiguousInput<T>{inputs.p, {}}...);

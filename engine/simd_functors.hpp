@@ -14,6 +14,7 @@
 // of T (a scalar shift by the width is undefined); debug builds assert it.
 #pragma once
 
+#include "engine/lane_operands.hpp"
 #include "engine/parallel_limits.hpp"
 #include "engine/sse2_lanes.hpp"
 
@@ -115,13 +116,14 @@ private:
 };
 // a with bit `bitIndex` set if v is not zero (in W's own type), cleared if it
 // is. W is T in the vector pair; bitset also uses it with other value types,
-// and for 64-bit T, in the plain two-input operator with this limit. Where W
-// is an integer or logical type of T's width, up to 32 bits, lanes() does
-// the same to a register of each; a logical is not zero where its byte isn't.
+// and for 64-bit T, in the plain two-input operator with this limit. For T
+// of up to 32 bits lanes() does the same to a register of T, with the truth
+// of the values in its lanes.
 template <class T, class W>
 class IntBitsetFtor {
 public:
     static constexpr unsigned long parallelLimit = limits::bitsetScalarPosition;
+    static constexpr lanes::Reading secondOperand = lanes::Reading::truth;
 
     explicit IntBitsetFtor(std::uint32_t bitIndex) noexcept : bitIndex_(bitIndex) {
         assert(belowWidth<T>(bitIndex));
@@ -134,7 +136,7 @@ public:
         return static_cast<T>(v != W{} ? (bits | mask) : (bits & ~mask));
     }
 
-    __m128i lanes(__m128i a, __m128i v) const noexcept requires lanes::SameWidthLanes<T, W> {
+    __m128i lanes(__m128i a, __m128i v) const noexcept requires lanes::RegisterLanes<T> {
         return setWhereNonZero<T>(a, v, lanes::repeat<T>(1u << bitIndex_));
     }
 

@@ -1,8 +1,9 @@
 // The SSE2 instructions by element width: every operation on a register of
 // T's lanes that depends on the width (or signedness) of T is chosen here,
 // and only here. The functors are written against these. Besides the shifts
-// of all lanes by one count, shifts of each lane by its own count, which
-// SSE2 lacks, built from shifts by constants.
+// of all lanes by one count, powers of two of each lane's own count and the
+// shifts of each lane by its own count that they give through products,
+// which SSE2 lacks otherwise.
 #pragma once
 
 #include <emmintrin.h>
@@ -14,11 +15,10 @@
 
 namespace bitfcns::lanes {
 
-// Integer (or logical) element types that line up lane for lane in one
-// register: the same width, of 8, 16 or 32 bits.
-template <class T, class U>
-concept SameWidthLanes = std::integral<T> && std::integral<U> && sizeof(T) == sizeof(U) &&
-                         sizeof(T) <= 4;
+// Integer element types whose lanes the operations below serve: 8, 16 and
+// 32 bits wide.
+template <class T>
+concept RegisterLanes = std::integral<T> && sizeof(T) <= 4;
 
 // Elements of T in one 16-byte register.
 template <class T>
@@ -176,124 +176,80 @@ inline __m128i select(__m128i whereTrue, __m128i a, __m128i b) noexcept {
 
 namespace each_detail {
 
-enum class Shift { left, rightLogical, rightArithmetic };
-
-// Every lane shifted by the constant s. 8-bit lanes move inside 16-bit
-// lanes and lose, by a mask, the bits that crossed from the neighbour.
-template <class T, Shift kind, int s>
-__m128i shiftBy(__m128i v) noexcept {
-    static_assert(sizeof(T) > 1 || kind != Shift::rightArithmetic,
-                  "bytes shift arithmetically by their sign");
-    if constexpr (sizeof(T) == 1 && kind == Shift::left && s == 1) {
-        return _mm_add_epi8(v, v);
-    } else if constexpr (sizeof(T) == 1 && kind == Shift::left) {
-        return _mm_and_si128(_mm_slli_epi16(v, s), _mm_set1_epi8(static_cast<char>(0xFF << s)));
-    } else if constexpr (sizeof(T) == 1) {
-        return _mm_and_si128(_mm_srli_epi16(v, s), _mm_set1_epi8(static_cast<char>(0xFF >> s)));
-    } else if constexpr (sizeof(T) == 2 && kind == Shift::left) {
-        return _mm_slli_epi16(v, s);
-    } else if constexpr (sizeof(T) == 2 && kind == Shift::rightLogical) {
-        return _mm_srli_epi16(v, s);
-    } else if constexpr (sizeof(T) == 2) {
-        return _mm_srai_epi16(v, s);
-    } else if constexpr (kind == Shift::left) {
-        return _mm_slli_epi32(v, s);
-    } else if constexpr (kind == Shift::rightLogical) {
-        return _mm_srli_epi32(v, s);
-    } else {
-        return _mm_srai_epi32(v, s);
-    }
+// All ones in each byte of k whose bit c is set: bit c moved to the sign bit
+// by a 16-bit shift, which carries a byte's bits only into the low bits of
+// the next byte, far from its sign.
+template <int c>
+__m128i whereBitSet8(__m128i k) noexcept {
+    return _mm_cmplt_epi8(_mm_slli_epi16(k, 7 - c), _mm_setzero_si128());
 }
 
-// All ones in each lane of k whose bit c is set, k's lanes in [0, width):
-// bit c moved to the sign bit and spread. A 16-bit shift of byte lanes
-// carries a count's bits only into the low bits of the next byte, far from
-// its sign.
-template <class T, int c>
-__m128i whereBitSet(__m128i k) noexcept {
-    if constexpr (sizeof(T) == 1) {
-        return _mm_cmplt_epi8(_mm_slli_epi16(k, 7 - c), _mm_setzero_si128());
-    } else if constexpr (sizeof(T) == 2) {
-        return _mm_srai_epi16(_mm_slli_epi16(k, 15 - c), 15);
-    } else {
-        return _mm_srai_epi32(_mm_slli_epi32(k, 31 - c), 31);
-    }
+// 2^k in each 32-bit lane, k in [0, 32): k made the exponent of a single
+// and truncated back; 2^31 overflows the conversion into 0x80000000, which
+// is its pattern.
+inline __m128i powerOfTwo32(__m128i k) noexcept {
+    const __m128i biased = _mm_add_epi32(_mm_slli_epi32(k, 23), _mm_set1_epi32(127 << 23));
+    return _mm_cvttps_epi32(_mm_castsi128_ps(biased));
 }
 
-// Each lane of v shifted by its own count in k: for each bit c of the
-// counts, the shift by 2^c kept in the lanes whose count has that bit.
-template <class T, Shift kind, int... c>
-__m128i shiftEach(__m128i v, __m128i k, std::integer_sequence<int, c...>) noexcept {
-    ((v = select(whereBitSet<T, c>(k), shiftBy<T, kind, (1 << c)>(v), v)), ...);
-    return v;
+// The 64-bit products of the 32-bit lanes of a and b, their low halves and
+// their high halves, lane by lane.
+struct Products32 {
+    __m128i low;
+    __m128i high;
+};
+inline Products32 multiply32(__m128i a, __m128i b) noexcept {
+    const __m128i even = _mm_mul_epu32(a, b);
+    const __m128i odd = _mm_mul_epu32(_mm_srli_epi64(a, 32), _mm_srli_epi64(b, 32));
+    return {_mm_unpacklo_epi32(_mm_shuffle_epi32(even, _MM_SHUFFLE(3, 1, 2, 0)),
+                               _mm_shuffle_epi32(odd, _MM_SHUFFLE(3, 1, 2, 0))),
+            _mm_unpacklo_epi32(_mm_shuffle_epi32(even, _MM_SHUFFLE(2, 0, 3, 1)),
+                               _mm_shuffle_epi32(odd, _MM_SHUFFLE(2, 0, 3, 1)))};
 }
-
-// The bits of a count below T's width: 3, 4 or 5.
-template <class T>
-using CountBits = std::make_integer_sequence<int, sizeof(T) == 1   ? 3
-                                                  : sizeof(T) == 2 ? 4
-                                                                   : 5>;
 
 }  // namespace each_detail
 
-// Each lane of v shifted left by the count in the same lane of k, every
-// count in [0, width). Signed and unsigned alike. 8, 16 and 32-bit lanes.
+// 2^k in each lane, for each lane's k in [0, width), as T's pattern: 2^7,
+// 2^15 and 2^31 are the sign bit. 8, 16 and 32-bit lanes.
 template <class T>
-__m128i shiftLeftEach(__m128i v, __m128i k) noexcept {
-    using namespace each_detail;
-    return shiftEach<T, Shift::left>(v, k, CountBits<T>{});
-}
-
-// As shiftLeftEach, shifting right logically.
-template <class T>
-__m128i shiftRightLogicalEach(__m128i v, __m128i k) noexcept {
-    using namespace each_detail;
-    return shiftEach<T, Shift::rightLogical>(v, k, CountBits<T>{});
-}
-
-// As shiftLeftEach, shifting right arithmetically. Bytes are shifted
-// logically with their sign bits inverted, and inverted back: for a negative
-// x, x >> k is NOT((NOT x) >> k).
-template <class T>
-__m128i shiftRightArithmeticEach(__m128i v, __m128i k) noexcept {
+__m128i powerOfTwoEach(__m128i k) noexcept {
     using namespace each_detail;
     if constexpr (sizeof(T) == 1) {
-        const __m128i sign = isNegative<T>(v);
-        return _mm_xor_si128(shiftRightLogicalEach<T>(_mm_xor_si128(v, sign), k), sign);
+        // 1 or 2 by bit 0, times 4 by bit 1, times 16 by bit 2; a 16-bit
+        // shift of bytes of at most 8 by 4 spills nothing into the next.
+        __m128i power = _mm_sub_epi8(_mm_set1_epi8(1), whereBitSet8<0>(k));
+        power = select(whereBitSet8<1>(k), _mm_slli_epi16(power, 2), power);
+        return select(whereBitSet8<2>(k), _mm_slli_epi16(power, 4), power);
+    } else if constexpr (sizeof(T) == 2) {
+        // Through 32-bit lanes; each power sign-extended from 16 bits, so
+        // the signed pack keeps its pattern.
+        const __m128i zero = _mm_setzero_si128();
+        const auto half = [](__m128i power) {
+            return _mm_srai_epi32(_mm_slli_epi32(power, 16), 16);
+        };
+        return _mm_packs_epi32(half(powerOfTwo32(_mm_unpacklo_epi16(k, zero))),
+                               half(powerOfTwo32(_mm_unpackhi_epi16(k, zero))));
     } else {
-        return shiftEach<T, Shift::rightArithmetic>(v, k, CountBits<T>{});
-    }
-}
-
-// Arithmetic for signed T, logical for unsigned T.
-template <class T>
-__m128i shiftRightEach(__m128i v, __m128i k) noexcept {
-    if constexpr (std::is_signed_v<T>) {
-        return shiftRightArithmeticEach<T>(v, k);
-    } else {
-        return shiftRightLogicalEach<T>(v, k);
+        return powerOfTwo32(k);
     }
 }
 
 // Each lane shifted left by its count k and, apart, right by width - k
 // (arithmetically for signed T, logically for unsigned T), every count in
 // [0, width): a right shift by the whole width leaves the lane's sign fill.
+// Both come from one product by 2^k of the lane extended to twice its
+// width: its low half is the lane shifted left, its high half the lane
+// shifted right, arithmetically where the lane was extended by its sign.
 struct ShiftedBothWays {
     __m128i left;
     __m128i right;
 };
 template <class T>
 ShiftedBothWays shiftBothWaysEach(__m128i v, __m128i k) noexcept {
+    const __m128i power = powerOfTwoEach<T>(k);
     if constexpr (sizeof(T) == 1) {
-        // One product per byte gives both: the byte extended as T to 16 bits
-        // times 2^k has the byte shifted left by k in its low half and
-        // shifted right by 8 - k in its high half. Even bytes are multiplied
-        // in the low halves of the 16-bit lanes, odd ones in the high halves.
-        using namespace each_detail;
-        const __m128i one = _mm_set1_epi8(1);
-        __m128i power = _mm_sub_epi8(one, whereBitSet<T, 0>(k));
-        power = select(whereBitSet<T, 1>(k), _mm_slli_epi16(power, 2), power);  // at most 8
-        power = select(whereBitSet<T, 2>(k), _mm_slli_epi16(power, 4), power);
+        // Even bytes are multiplied in the low halves of the 16-bit lanes,
+        // odd ones in the high halves, each extended as T.
         const __m128i low = _mm_set1_epi16(0x00FF);
         const __m128i even =
             std::is_signed_v<T> ? _mm_srai_epi16(_mm_slli_epi16(v, 8), 8) : _mm_and_si128(v, low);
@@ -303,11 +259,25 @@ ShiftedBothWays shiftBothWaysEach(__m128i v, __m128i k) noexcept {
         return {_mm_or_si128(_mm_and_si128(evenProduct, low), _mm_slli_epi16(oddProduct, 8)),
                 _mm_or_si128(_mm_srli_epi16(evenProduct, 8), _mm_andnot_si128(low, oddProduct))};
     } else {
-        // By width - k as by 1, then by width - 1 - k, which is k's low bits
-        // inverted.
-        const __m128i fromTop = _mm_xor_si128(k, repeat<T>(bitsOf<T> - 1));
-        return {shiftLeftEach<T>(v, k),
-                shiftRightEach<T>(shiftRight<T>(v, countRegister(1)), fromTop)};
+        // SSE2 multiplies 16 and 32-bit lanes without sign only. A negative
+        // lane of a signed T is multiplied inverted and its high half
+        // inverted back, since x >> s is NOT((NOT x) >>> s) there; its low
+        // half then differs from x shifted left by the inverted bits shifted
+        // in, NOT(2^k - 1) = -2^k.
+        const __m128i sign = std::is_signed_v<T> ? isNegative<T>(v) : _mm_setzero_si128();
+        const __m128i x = _mm_xor_si128(v, sign);
+        __m128i low, high;
+        if constexpr (sizeof(T) == 2) {
+            low = _mm_mullo_epi16(x, power);
+            high = _mm_mulhi_epu16(x, power);
+        } else {
+            const each_detail::Products32 product = each_detail::multiply32(x, power);
+            low = product.low;
+            high = product.high;
+        }
+        if constexpr (!std::is_signed_v<T>) return {low, high};
+        const __m128i shiftedIn = _mm_and_si128(sign, subtract<T>(_mm_setzero_si128(), power));
+        return {_mm_xor_si128(low, shiftedIn), _mm_xor_si128(high, sign)};
     }
 }
 

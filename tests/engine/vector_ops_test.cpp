@@ -6,6 +6,7 @@
 // through a record at every placement.
 #include "engine/vector_ops.hpp"
 #include "bitget/bitget_ftors.hpp"
+#include "bitset/bitset_functors.hpp"
 #include "bitshift/shift_rule.hpp"
 
 #include <gtest/gtest.h>
@@ -113,54 +114,69 @@ TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
         }
 }
 
-// Pairs of element types (value, second operand) that have vector forms.
+// Element types (value, second operand) of the vector forms: values of 8,
+// 16 and 32 bits with second operands of their own width, narrower, wider,
+// of the other signedness, floating and logical.
 template <class P>
 class VectorForms : public ::testing::Test {};
 template <class T, class U>
 using P = std::pair<T, U>;
+using i8 = std::int8_t;
+using u8 = std::uint8_t;
+using i16 = std::int16_t;
+using u16 = std::uint16_t;
+using i32 = std::int32_t;
+using u32 = std::uint32_t;
 using Pairs = ::testing::Types<
-    P<std::uint8_t, std::uint8_t>, P<std::uint8_t, std::int8_t>, P<std::int8_t, std::uint8_t>,
-    P<std::int8_t, std::int8_t>, P<std::int8_t, bool>, P<std::uint16_t, std::int16_t>,
-    P<std::int16_t, std::uint16_t>, P<std::int16_t, std::int16_t>, P<std::uint32_t, std::int32_t>,
-    P<std::int32_t, std::uint32_t>, P<std::int32_t, std::int32_t>>;
+    P<u8, u8>, P<u8, i8>, P<i8, u8>, P<i8, i8>, P<i8, bool>, P<u8, i16>, P<i8, u32>, P<u8, long>,
+    P<i8, unsigned long>, P<u8, double>, P<i8, float>, P<u16, i16>, P<i16, u16>, P<i16, i8>,
+    P<u16, u8>, P<i16, i32>, P<u16, u32>, P<i16, unsigned long>, P<u16, double>, P<i16, bool>,
+    P<u32, i32>, P<i32, u32>, P<i32, i8>, P<u32, u16>, P<i32, long>, P<u32, unsigned long>,
+    P<i32, double>, P<u32, float>, P<i32, bool>>;
 TYPED_TEST_SUITE(VectorForms, Pairs);
 
 // Every pair of 8-bit elements; for wider ones every pair of edge values
-// and counts around the width, then random pairs, half of them with small
-// second operands.
+// (counts around the width, the limits of T and U, U's values that a
+// narrower lane would wrap), then random pairs, half of them with small
+// second operands. Floating second operands are whole.
 template <class T, class U>
 void operandPairs(std::vector<T>& a, std::vector<U>& b) {
     constexpr long w = 8 * sizeof(T), min = std::numeric_limits<T>::min(),
                    max = std::numeric_limits<T>::max();
     std::vector<long> edges{0,     1,  2,      -1,  w - 1,   w,       w + 1,
                             1 - w, -w, -w - 1, min, min + 1, max - 1, max};
-    if (w == 8) {
+    for (long wrap : {0x100l, 0x10000l, 0x100000000l}) edges.insert(edges.end(), {wrap + 3, -wrap - 3});
+    std::vector<U> ends{std::numeric_limits<U>::lowest(), std::numeric_limits<U>::max()};
+    if (std::is_same_v<T, U> && w == 8) {
         edges.resize(256);
         std::iota(edges.begin(), edges.end(), 0l);
+        ends.clear();
     }
+    std::vector<U> seconds(ends);
+    for (long y : edges) seconds.push_back(static_cast<U>(y));
     for (long x : edges)
-        for (long y : edges) a.push_back(static_cast<T>(x)), b.push_back(static_cast<U>(y));
+        for (U y : seconds) a.push_back(static_cast<T>(x)), b.push_back(y);
     std::mt19937_64 random(13);
-    while (a.size() % 16 != 0 || (sizeof(T) > 1 && a.size() < 20000)) {
+    while (a.size() % 16 != 0 || a.size() < 20000) {
         a.push_back(static_cast<T>(random()));
         const auto r = random();
-        b.push_back(static_cast<U>(r % 2 ? r : r % (4 * w) - 2 * w));
+        b.push_back(static_cast<U>(r % 2 ? static_cast<long>(r) : static_cast<long>(r % (4 * w)) - 2 * w));
     }
 }
 
-// ftor.lanes(a, b) against ftor(a[i], b[i]) in every lane, b's elements
-// stored as S and passed to operator() as U.
-template <class U, class T, class S, class Ftor>
+// ftor.lanes(a, b) against ftor(a[i], b[i]) in every lane, b read into the
+// lanes as the functor reads it.
+template <class T, class U, class Ftor>
 void expectLanesMatchScalar(const char* name, const Ftor& ftor, const std::vector<T>& a,
-                            const std::vector<S>& b) {
+                            const U* b) {
     constexpr unsigned long count = 16 / sizeof(T);
     T results[count];
     for (unsigned long i = 0; i < a.size(); i += count) {
         const __m128i va = _mm_loadu_si128(reinterpret_cast<const __m128i*>(a.data() + i));
-        const __m128i vb = _mm_loadu_si128(reinterpret_cast<const __m128i*>(b.data() + i));
+        const __m128i vb = lanes::readLanesOf<T, Ftor::secondOperand>(b + i);
         _mm_storeu_si128(reinterpret_cast<__m128i*>(results), ftor.lanes(va, vb));
         for (unsigned long k = 0; k < count; ++k)
-            ASSERT_EQ(results[k], ftor(a[i + k], static_cast<U>(b[i + k])))
+            ASSERT_EQ(results[k], ftor(a[i + k], b[i + k]))
                 << name << "(" << +a[i + k] << ", " << +b[i + k] << ")";
     }
 }
@@ -176,29 +192,42 @@ TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
     operandPairs(a, b);
     if constexpr (std::is_same_v<U, bool>)
         for (S& v : b) v = v & 1;
+    if constexpr (std::is_floating_point_v<U>) {
+        // Truth values only: a NaN is true, -0.0 false.
+        std::vector<U> truths(b);
+        for (unsigned long i = 0; i < truths.size(); i += 7)
+            truths[i] = i % 3 == 0 ? std::numeric_limits<U>::quiet_NaN() : i % 3 == 1 ? U(-0.0) : U(0.5);
+        for (std::uint32_t bit = 0; bit < w; bit += 3)
+            expectLanesMatchScalar("bitset", IntBitsetFtor<T, U>(bit), a, truths.data());
+    }
+    const U* second = reinterpret_cast<const U*>(b.data());
     for (std::uint32_t bit = 0; bit < w; ++bit)
-        expectLanesMatchScalar<U>("bitset", IntBitsetFtor<T, U>(bit), a, b);
+        expectLanesMatchScalar("bitset", IntBitsetFtor<T, U>(bit), a, second);
     if constexpr (!std::is_same_v<U, bool>) {
-        expectLanesMatchScalar<U>("bitshift", bitshiftVVFtor<T, U>{int(w)}, a, b);
+        expectLanesMatchScalar("bitshift", bitshiftVVFtor<T, U>{int(w)}, a, second);
         std::vector<U> positions(b.size());
-        for (unsigned long i = 0; i < b.size(); ++i) positions[i] = static_cast<U>(1 + b[i] % w);
-        expectLanesMatchScalar<U>("bitget", bitgetVVFtor<T, U>{}, a, positions);
+        for (unsigned long i = 0; i < b.size(); ++i) positions[i] = static_cast<U>(1 + (i * 7 + i / 5) % w);
+        expectLanesMatchScalar("bitget", bitgetVVFtor<T, U>{}, a, positions.data());
+        expectLanesMatchScalar("bitset", bitsetVVTFtor<T, U>{}, a, positions.data());
+        expectLanesMatchScalar("bitclear", bitsetVVFFtor<T, U>{}, a, positions.data());
     }
 }
 
 // The vector loop of a two-input record: every offset within a register of
 // output and both inputs, in place or not, at lengths around multiples of a
-// register and a cache line, nothing written outside the result; and a
-// split run.
-TEST(VectorLoop, RunsAtEveryPlacementMatchTheScalarFunctor) {
-    using T = std::int8_t;
-    using Record = bitfcnsTwoInputVectorOp<T, T, bitshiftVVFtor<T, T>>;
-    const bitshiftVVFtor<T, T> ftor{8};
-    std::vector<T> a, b;
+// register and a cache line, nothing written outside the result; and a split
+// run over inputs of exactly n elements, which a read past them would leave.
+template <class T, class U>
+void expectEveryPlacementToMatch() {
+    using Record = bitfcnsTwoInputVectorOp<T, U, bitshiftVVFtor<T, U>>;
+    const bitshiftVVFtor<T, U> ftor{8 * sizeof(T)};
+    std::vector<T> a;
+    std::vector<U> b;
     operandPairs(a, b);
     constexpr unsigned long room = 200;
     const T sentinel = 0x5A;
-    std::vector<T> out(room), in1(room), in2(room);
+    std::vector<T> out(room), in1(room);
+    std::vector<U> in2(room);
     for (unsigned long n : {0, 1, 15, 16, 17, 31, 33, 63, 64, 65, 79, 130})
         for (unsigned long form = 0; form < 2 * 16 * 16 * 16; ++form) {
             const unsigned long oo = form % 16, o1 = form / 16 % 16, o2 = form / 256 % 16;
@@ -217,9 +246,18 @@ TEST(VectorLoop, RunsAtEveryPlacementMatchTheScalarFunctor) {
                     << o2 << (inPlace ? ", in place" : "");
             }
         }
+    a.pop_back();
+    b.pop_back();
+    b.shrink_to_fit();
     std::vector<T> split(a.size());
     runWithLimit(Record{a.data(), b.data(), split.data(), 1, 1, a.size(), ftor}, 1);
     for (unsigned long i = 0; i < a.size(); ++i) ASSERT_EQ(split[i], ftor(a[i], b[i])) << i;
+}
+
+TEST(VectorLoop, RunsAtEveryPlacementMatchTheScalarFunctor) {
+    expectEveryPlacementToMatch<std::int8_t, std::int8_t>();
+    expectEveryPlacementToMatch<std::uint8_t, double>();
+    expectEveryPlacementToMatch<std::int32_t, std::int8_t>();
 }
 
 }  // namespace
