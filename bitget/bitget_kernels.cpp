@@ -23,10 +23,11 @@ namespace bitfcns {
 namespace {
 
 // Raises the bit position error unless each of the `count` positions is a
-// whole number from 1 to T's width.
+// whole number from 1 to T's width; checked on threads from `limit`, that of
+// the loop that follows.
 template <class T, class U>
-void requireValidPositions(const U* positions, unsigned long count) {
-    if (!allPositionsValid(positions, count, bitWidth<T>))
+void requireValidPositions(const U* positions, unsigned long count, unsigned long limit) {
+    if (!allPositionsValid(positions, count, bitWidth<T>, {limit, &runInRanges}))
         raiseError<VESPRA::bitSetGet::BITOutOfRange>();
 }
 
@@ -45,12 +46,12 @@ void bitgetIntegerDriver(T* out, const T* in, const U* positions, unsigned long 
                          unsigned long positionStride, unsigned long n) {
     if (positionStride != 0) {
         if (n == 0) return;
-        requireValidPositions<T>(positions, n);
+        requireValidPositions<T>(positions, n, limits::bitgetPositionArray);
         getBitsAtPositions(out, in, positions, valueStride, n);
         return;
     }
     // One position, tested even when there are no values; p - 1 in U's width.
-    requireValidPositions<T>(positions, 1);
+    requireValidPositions<T>(positions, 1, limits::bitgetPositionArray);
     const auto bitIndex = static_cast<std::make_unsigned_t<U>>(positions[0]) - 1u;
     GetOneBit::run(out, in, valueStride, n, static_cast<std::uint32_t>(bitIndex));
 }
@@ -62,7 +63,7 @@ requires std::is_floating_point_v<U>
 void bitgetFloatingPositions(T* out, const T* in, const U* positions, unsigned long valueStride,
                              unsigned long positionStride, unsigned long n) {
     if (positionStride != 0 && n == 0) return;
-    requireValidPositions<T>(positions, positionStride == 0 ? 1 : n);
+    requireValidPositions<T>(positions, positionStride == 0 ? 1 : n, limits::bitgetPositionArray);
     if (positionStride == 0) {
         const auto bitIndex = static_cast<std::int32_t>(positions[0]) - 1;
         GetOneBit::run(out, in, valueStride, n, static_cast<std::uint32_t>(bitIndex));
@@ -96,9 +97,11 @@ void bitgetDoubleDriver(const zqArray_tag* values, const zqArray_tag* positions,
         return;
     // All values before any position, so a bad value hides a bad position.
     if (valuesScalar || n != 0) {
-        if (!allFitInteger<T>(x, valuesScalar ? 1 : n)) raiseError<VESPRA::bitget::outOfRange>();
+        if (!allFitInteger<T>(x, valuesScalar ? 1 : n, {limits::bitgetOnDouble, &runInRanges}))
+            raiseError<VESPRA::bitget::outOfRange>();
     }
-    if (positionsScalar || n != 0) requireValidPositions<T>(p, positionsScalar ? 1 : n);
+    if (positionsScalar || n != 0)
+        requireValidPositions<T>(p, positionsScalar ? 1 : n, limits::bitgetOnDouble);
     runVectorOp(bitfcnsTwoInputVectorOp<double, double, BitgetFtor<T>>{
         x, p, out, valuesScalar ? 0ul : 1ul, positionsScalar ? 0ul : 1ul, n, {}});
 }

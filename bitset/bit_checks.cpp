@@ -2,6 +2,7 @@
 // BIT, shared by the kernels of every class of A and by the double path.
 #include "bitset/bit_checks.hpp"
 
+#include "engine/parallel_driver.hpp"
 #include "frame/class_types.hpp"
 #include "frame/exception.hpp"
 #include "frame/message_tags.hpp"
@@ -14,8 +15,8 @@ namespace bitfcns {
 void raiseBitOutOfRange() { raiseError<VESPRA::bitSetGet::BITOutOfRange>(); }
 
 template <class U>
-void checkPositions(const U* positions, unsigned long n, int width) {
-    if (!allPositionsValid(positions, n, width)) raiseBitOutOfRange();
+void checkPositions(const U* positions, unsigned long n, int width, unsigned long limit) {
+    if (!allPositionsValid(positions, n, width, {limit, &runInRanges})) raiseBitOutOfRange();
 }
 
 namespace {

@@ -21,10 +21,10 @@ std::uint32_t checkedBitIndex(U b, int width) {
     return bitIndexOf(b);
 }
 
-// All n positions must be valid. Defined in bit_checks.cpp, once for each
-// numeric class of BIT, which every kernel calls whatever its classes of A
-// and V.
+// All n positions must be valid; checked on threads from `limit`, that of
+// the loop that follows. Defined in bit_checks.cpp, once for each numeric
+// class of BIT, which every kernel calls whatever its classes of A and V.
 template <class U>
-void checkPositions(const U* positions, unsigned long n, int width);
+void checkPositions(const U* positions, unsigned long n, int width, unsigned long limit);
 
 }  // namespace bitfcns

@@ -16,6 +16,7 @@
 #include "bitset/bitset_functors.hpp"
 #include "bitset/bitset_kernels.hpp"
 #include "engine/operator_families.hpp"
+#include "engine/parallel_limits.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/class_types.hpp"
 
@@ -92,7 +93,9 @@ template <class T, class U, class W>
                              checkedBitIndex(bit[0], width));
         return;
     }
-    checkPositions(bit, n, width);
+    checkPositions(bit, n, width,
+                   strideValue == 0 ? limits::bitsetPositionArrayTrue
+                                    : limits::bitsetPositionValueArrays);
     if (strideValue == 0) {
         bitsetPositionArrayKernel(out, a, bit, strideA, strideBit, n, isTrue(value[0]));
     } else if (n != 0) {

@@ -76,8 +76,10 @@ void bitsetDoubleDriver(const zqArray_tag* a, const zqArray_tag* bit, const bool
     if (!scalarA && scalarBit && !scalarValue &&
         setAtOnePositionByValues<T>(values, *positions, valueData, out, n))
         return;
-    if (!allFitInteger<T>(values, scalarA ? 1 : n)) raiseError<errors::outOfRange>();
-    checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>);
+    constexpr unsigned long limit = limits::bitsetOnDouble;
+    if (!allFitInteger<T>(values, scalarA ? 1 : n, {limit, &runInRanges}))
+        raiseError<errors::outOfRange>();
+    checkPositions(positions, scalarBit ? 1 : n, bitWidth<T>, limit);
     runVectorOp(
         bitfcnsThreeInputVectorOp<double, double, bool, BitsetFtor<T>>{values,
                                                                        positions,

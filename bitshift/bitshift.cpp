@@ -99,8 +99,10 @@ void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, z
             runCheckedLanes(BitshiftCountsLanes<T>{}, values, counts, out, n, &runInRanges))
             return;
     }
-    if (!allFitInteger<T>(values, firstIsScalar ? 1 : n)) raiseError<errors::outOfRange>();
-    if (!allWholeCounts(counts, secondIsScalar ? 1 : n)) raiseError<errors::inputsMustBeIntegers>();
+    const ScanRunner runner{limits::bitshiftOnDouble, &runInRanges};
+    if (!allFitInteger<T>(values, firstIsScalar ? 1 : n, runner)) raiseError<errors::outOfRange>();
+    if (!allWholeCounts(counts, secondIsScalar ? 1 : n, runner))
+        raiseError<errors::inputsMustBeIntegers>();
     if (n == 0) return;
     runVectorOp(bitfcnsTwoInputVectorOp<double, double, BitshiftFtor<T>>{
         values, counts, out, firstIsScalar ? 0ul : 1ul, secondIsScalar ? 0ul : 1ul, n, {}});

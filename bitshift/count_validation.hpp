@@ -44,4 +44,12 @@ inline bool allWholeCounts(const double* counts, unsigned long n) noexcept {
     return allLanesPass(counts, n, WholeCountLanes{}, [](double x) { return isWholeNumber(x); });
 }
 
+// Either, spread over threads by `runner` from its limit.
+template <class U>
+bool allWholeCounts(const U* counts, unsigned long n, ScanRunner runner) {
+    return everyRangePasses(n, runner, [counts](unsigned long begin, unsigned long end) {
+        return allWholeCounts(counts + begin, end - begin);
+    });
+}
+
 }  // namespace bitfcns

@@ -12,6 +12,8 @@
 #include "bitshift/count_validation.hpp"
 #include "bitshift/shift_rule.hpp"
 #include "engine/operator_families.hpp"
+#include "engine/parallel_driver.hpp"
+#include "engine/parallel_limits.hpp"
 #include "engine/vector_ops.hpp"
 #include "frame/array.hpp"
 #include "frame/class_types.hpp"
@@ -87,7 +89,8 @@ void bitshiftCaseKernel(T* out, const T* in, const U* count, unsigned long /*out
                         unsigned long valueStride, unsigned long countStride, unsigned long n) {
     if constexpr (std::is_floating_point_v<U>) {
         if (countStride != 0 && n == 0) return;
-        if (!allWholeCounts(count, countStride != 0 ? n : 1))
+        if (!allWholeCounts(count, countStride != 0 ? n : 1,
+                            {limits::bitshiftCountArray, &runInRanges}))
             raiseError<VESPRA::bitshift::inputsMustBeIntegers>();
     }
     if (n == 0) return;

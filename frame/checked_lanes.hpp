@@ -13,6 +13,8 @@
 //                                check refuses (never undefined behaviour).
 #pragma once
 
+#include "frame/range_runner.hpp"
+
 #include <emmintrin.h>
 #include <xmmintrin.h>
 
@@ -20,14 +22,6 @@
 #include <type_traits>
 
 namespace bitfcns {
-
-// Treats [begin, end) of the run whose state `context` points to.
-using LaneRangeBody = void (*)(const void* context, unsigned long begin,
-                               unsigned long end) noexcept;
-// Runs `body` over [0, n): on the calling thread below `limit`, spread over
-// threads from it.
-using RangeRunner = void (*)(unsigned long n, unsigned long limit, LaneRangeBody body,
-                             const void* context);
 
 namespace lane_loop_detail {
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "frame/floating.hpp"
+#include "frame/range_runner.hpp"
 
 #include <emmintrin.h>
 
@@ -80,6 +81,14 @@ template <class T>
 bool allFitInteger(const double* data, unsigned long n) noexcept {
     return allLanesPass(data, n, scan_detail::LaneTest<T>{},
                         [](double x) { return fitsInteger<T>(x); });
+}
+
+// The same, spread over threads by `runner` from its limit.
+template <class T>
+bool allFitInteger(const double* data, unsigned long n, ScanRunner runner) {
+    return everyRangePasses(n, runner, [data](unsigned long begin, unsigned long end) {
+        return allFitInteger<T>(data + begin, end - begin);
+    });
 }
 
 }  // namespace bitfcns

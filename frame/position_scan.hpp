@@ -5,6 +5,7 @@
 #pragma once
 
 #include "frame/bit_positions.hpp"
+#include "frame/range_runner.hpp"
 
 #include <emmintrin.h>
 
@@ -85,6 +86,14 @@ bool allPositionsValid(const U* positions, unsigned long n, int width) noexcept 
         if (!position_scan_detail::blockValid(positions + start, count, width)) return false;
     }
     return true;
+}
+
+// The same, spread over threads by `runner` from its limit.
+template <class U>
+bool allPositionsValid(const U* positions, unsigned long n, int width, ScanRunner runner) {
+    return everyRangePasses(n, runner, [positions, width](unsigned long begin, unsigned long end) {
+        return allPositionsValid(positions + begin, end - begin, width);
+    });
 }
 
 }  // namespace bitfcns
