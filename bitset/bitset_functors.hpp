@@ -12,6 +12,7 @@
 
 #include "engine/lane_operands.hpp"
 #include "engine/parallel_limits.hpp"
+#include "engine/simd_functors.hpp"
 #include "engine/sse2_lanes.hpp"
 #include "frame/class_types.hpp"
 #include "frame/double_lanes.hpp"
@@ -62,23 +63,31 @@ bool isTrue(W v) noexcept {
     return v != W{};
 }
 
-// a with bit b set where v is true and cleared where it is false; BIT and V
-// both arrays. The type of BIT is the call operator's own.
-template <class T, class W>
-struct bitsetVVVFtor {
-    static constexpr unsigned long parallelLimit = limits::bitsetPositionValueArrays;
-
-    template <class U>
-    T operator()(T a, U b, W v) const noexcept {
-        return withMask(a, maskAt<T>(bitIndexOf(b)), isTrue(v));
-    }
-};
-
 // The mask of bit b - 1 in each lane of T, b a valid position in the lane.
 template <class T>
 __m128i maskLanes(__m128i b) noexcept {
     return lanes::powerOfTwoEach<T>(lanes::subtract<T>(b, lanes::repeat<T>(1)));
 }
+
+// a with bit b set where v is true and cleared where it is false; BIT and V
+// both arrays. The type of BIT is the call operator's own. lanes() does the
+// same to a register of T of up to 32 bits.
+template <class T, class W>
+struct bitsetVVVFtor {
+    static constexpr unsigned long parallelLimit = limits::bitsetPositionValueArrays;
+    static constexpr lanes::Reading secondOperand = lanes::Reading::position;
+    static constexpr lanes::Reading thirdOperand = lanes::Reading::truth;
+
+    template <class U>
+    T operator()(T a, U b, W v) const noexcept {
+        return withMask(a, maskAt<T>(bitIndexOf(b)), isTrue(v));
+    }
+
+    __m128i lanes(__m128i a, __m128i b, __m128i v) const noexcept
+        requires lanes::RegisterLanes<T> {
+        return setWhereNonZero<T>(a, v, maskLanes<T>(b));
+    }
+};
 
 // a with bit b set: an array of BIT with one true V, or with none. lanes()
 // does the same to a register of T of up to 32 bits.

@@ -7,13 +7,14 @@
 // steps each input by its own stride. Software prefetch is issued once per
 // cache line of each contiguous input, not per element.
 //
-// A functor may also offer a vector form, `lanes(__m128i, __m128i)`, that
-// computes in every lane of a register what operator() computes for one
-// element, with `secondOperand`, the way its second operand is read into
-// the lanes. A contiguous run of two inputs whose first input and result
-// are of one integer class of 8, 16 or 32 bits then goes a register of the
-// first input a step through it, the second operand of any class read into
-// lanes of the same width, and finishes with operator() on the tail.
+// A functor may also offer a vector form, `lanes(__m128i, __m128i[, __m128i])`,
+// that computes in every lane of a register what operator() computes for
+// one element, with `secondOperand` (and `thirdOperand`), the way its other
+// operands are read into the lanes. A contiguous run whose first input and
+// result are of one integer class of 8, 16 or 32 bits then goes a register
+// of the first input a step through it, the other operands of any class
+// read into lanes of the same width, and finishes with operator() on the
+// tail.
 #pragma once
 
 #include "engine/lane_operands.hpp"
@@ -24,7 +25,9 @@
 
 #include <algorithm>
 #include <concepts>
+#include <cstddef>
 #include <type_traits>
+#include <utility>
 
 namespace bitfcns::plain_detail {
 
@@ -71,50 +74,76 @@ void elementLoop(Out* out, unsigned long begin, unsigned long end, Ftor ftor,
     for (; i < end; ++i) out[i] = ftor(inputs.at(i)...);
 }
 
-// A functor with a vector form for a first input of Out, the result's
-// class, and a second of In2. (The register type carries an attribute that
-// a template argument would drop, so the form's result is checked where it
-// is stored.)
-template <class Ftor, class Out, class In1, class In2>
-concept VectorFormOf = std::is_same_v<Out, In1> && lanes::RegisterLanes<Out> &&
-                       requires(const Ftor& ftor, __m128i a, __m128i b, __m128i* to) {
+// A functor with a vector form of two or three inputs, the first of Out, the
+// result's class. (The register type carries an attribute that a template
+// argument would drop, so the form's result is checked where it is stored.)
+template <class Ftor, class Out, class In1>
+concept VectorFormFor = std::is_same_v<Out, In1> && lanes::RegisterLanes<Out>;
+template <class Ftor>
+concept TwoInputVectorForm = requires(const Ftor& ftor, __m128i a, __m128i* to) {
     { Ftor::secondOperand } -> std::convertible_to<lanes::Reading>;
-    _mm_storeu_si128(to, ftor.lanes(a, b));
+    _mm_storeu_si128(to, ftor.lanes(a, a));
+};
+template <class Ftor>
+concept ThreeInputVectorForm = requires(const Ftor& ftor, __m128i a, __m128i* to) {
+    { Ftor::secondOperand } -> std::convertible_to<lanes::Reading>;
+    { Ftor::thirdOperand } -> std::convertible_to<lanes::Reading>;
+    _mm_storeu_si128(to, ftor.lanes(a, a, a));
 };
 template <class Ftor, class Out, class... In>
 inline constexpr bool hasVectorForm = false;
 template <class Ftor, class Out, class In1, class In2>
-requires VectorFormOf<Ftor, Out, In1, In2>
+requires VectorFormFor<Ftor, Out, In1> && TwoInputVectorForm<Ftor>
 inline constexpr bool hasVectorForm<Ftor, Out, In1, In2> = true;
+template <class Ftor, class Out, class In1, class In2, class In3>
+requires VectorFormFor<Ftor, Out, In1> && ThreeInputVectorForm<Ftor>
+inline constexpr bool hasVectorForm<Ftor, Out, In1, In2, In3> = true;
+
+// How the functor reads the input after the first one `k` places on.
+template <class Ftor, std::size_t k>
+constexpr lanes::Reading readingOf() noexcept {
+    if constexpr (k == 0) {
+        return Ftor::secondOperand;
+    } else {
+        return Ftor::thirdOperand;
+    }
+}
+
+// Prefetches the lines that `elements` elements from p on take.
+template <class T>
+void prefetchElements(const T* p, unsigned long elements) noexcept {
+    for (unsigned long line = 0; line < elements * sizeof(T); line += cacheLineBytes)
+        prefetchAhead(reinterpret_cast<const char*>(p) + line);
+}
 
 // The contiguous loop of a functor with a vector form: a register of the
-// first input a step, and the second's elements for it read into lanes of
-// the same width, in blocks of one cache line of the first input with the
-// prefetches of both at the start of each block, then the elements of the
-// tail one by one. Loads and stores are unaligned; an in-place result reads
-// each register before it writes it.
-template <class Out, class Ftor, class In1, class In2>
+// first input a step, and the other inputs' elements for it read into lanes
+// of the same width, in blocks of one cache line of the first input with the
+// prefetches of every input at the start of each block, then the elements
+// of the tail one by one. Loads and stores are unaligned; an in-place result
+// reads each register before it writes it.
+template <class Out, class Ftor, class In1, class... More>
 void vectorLoop(Out* out, unsigned long begin, unsigned long end, Ftor ftor, const In1* in1,
-                const In2* in2) noexcept {
+                const More*... more) noexcept {
     constexpr unsigned long perRegister = 16 / sizeof(Out);
     constexpr unsigned long block = cacheLineBytes / sizeof(Out);
-    const auto step = [&](unsigned long i) noexcept {
+    const auto step = [&]<std::size_t... k>(unsigned long i, std::index_sequence<k...>) noexcept {
         const __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(in1 + i));
-        const __m128i b = lanes::readLanesOf<Out, Ftor::secondOperand>(in2 + i);
-        _mm_storeu_si128(reinterpret_cast<__m128i*>(out + i), ftor.lanes(a, b));
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(out + i),
+                         ftor.lanes(a, lanes::readLanesOf<Out, readingOf<Ftor, k>()>(more + i)...));
     };
+    constexpr auto others = std::index_sequence_for<More...>{};
     unsigned long i = begin;
     // Blocks.
     for (; end - i >= block; i += block) {
         prefetchAhead(in1 + i);
-        for (unsigned long line = 0; line < block * sizeof(In2); line += cacheLineBytes)
-            prefetchAhead(reinterpret_cast<const char*>(in2 + i) + line);
-        for (unsigned long k = 0; k != block; k += perRegister) step(i + k);
+        (prefetchElements(more + i, block), ...);
+        for (unsigned long k = 0; k != block; k += perRegister) step(i + k, others);
     }
     // Single registers.
-    for (; end - i >= perRegister; i += perRegister) step(i);
+    for (; end - i >= perRegister; i += perRegister) step(i, others);
     // Tail.
-    for (; i < end; ++i) out[i] = ftor(in1[i], in2[i]);
+    for (; i < end; ++i) out[i] = ftor(in1[i], more[i]...);
 }
 
 // out[i] = ftor(inputs at i...) for i in [begin, end).

@@ -19,6 +19,7 @@
 #include <mutex>
 #include <numeric>
 #include <random>
+#include <sstream>
 #include <thread>
 #include <utility>
 #include <vector>
@@ -164,20 +165,28 @@ void operandPairs(std::vector<T>& a, std::vector<U>& b) {
     }
 }
 
-// ftor.lanes(a, b) against ftor(a[i], b[i]) in every lane, b read into the
-// lanes as the functor reads it.
-template <class T, class U, class Ftor>
+// ftor.lanes(a, more...) against ftor(a[i], more[i]...) in every lane, the
+// other operands read into the lanes as the functor reads them.
+template <class T, class Ftor, class... U>
 void expectLanesMatchScalar(const char* name, const Ftor& ftor, const std::vector<T>& a,
-                            const U* b) {
+                            const U*... more) {
     constexpr unsigned long count = 16 / sizeof(T);
     T results[count];
-    for (unsigned long i = 0; i < a.size(); i += count) {
+    const auto lanesAt = [&]<std::size_t... k>(unsigned long i, std::index_sequence<k...>) {
         const __m128i va = _mm_loadu_si128(reinterpret_cast<const __m128i*>(a.data() + i));
-        const __m128i vb = lanes::readLanesOf<T, Ftor::secondOperand>(b + i);
-        _mm_storeu_si128(reinterpret_cast<__m128i*>(results), ftor.lanes(va, vb));
-        for (unsigned long k = 0; k < count; ++k)
-            ASSERT_EQ(results[k], ftor(a[i + k], b[i + k]))
-                << name << "(" << +a[i + k] << ", " << +b[i + k] << ")";
+        return ftor.lanes(va, lanes::readLanesOf<T, plain_detail::readingOf<Ftor, k>()>(more + i)...);
+    };
+    for (unsigned long i = 0; i < a.size(); i += count) {
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(results),
+                         lanesAt(i, std::index_sequence_for<U...>{}));
+        for (unsigned long k = 0; k < count; ++k) {
+            const T expected = ftor(a[i + k], more[i + k]...);
+            if (results[k] == expected) continue;
+            std::ostringstream call;
+            call << name << "(" << +a[i + k];
+            ((call << ", " << +more[i + k]), ...);
+            FAIL() << call.str() << "): " << +results[k] << ", expected " << +expected;
+        }
     }
 }
 
@@ -210,6 +219,8 @@ TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
         expectLanesMatchScalar("bitget", bitgetVVFtor<T, U>{}, a, positions.data());
         expectLanesMatchScalar("bitset", bitsetVVTFtor<T, U>{}, a, positions.data());
         expectLanesMatchScalar("bitclear", bitsetVVFFtor<T, U>{}, a, positions.data());
+        expectLanesMatchScalar("bitset by values", bitsetVVVFtor<T, U>{}, a, positions.data(),
+                               second);
     }
 }
 
@@ -258,6 +269,29 @@ TEST(VectorLoop, RunsAtEveryPlacementMatchTheScalarFunctor) {
     expectEveryPlacementToMatch<std::int8_t, std::int8_t>();
     expectEveryPlacementToMatch<std::uint8_t, double>();
     expectEveryPlacementToMatch<std::int32_t, std::int8_t>();
+}
+
+// A three-input record, in one run and split, over inputs of exactly n
+// elements: the values, double positions and logical new bits.
+TEST(VectorLoop, ThreeInputRunsMatchTheScalarFunctor) {
+    using Ftor = bitsetVVVFtor<std::uint8_t, bool>;
+    using Record = bitfcnsThreeInputVectorOp<std::uint8_t, double, bool, Ftor>;
+    for (unsigned long n : {0ul, 15ul, 16ul, 1000ul, 1001ul}) {
+        std::vector<std::uint8_t> a(n), out(n);
+        std::vector<double> positions(n);
+        const std::unique_ptr<bool[]> values(new bool[n]);
+        for (unsigned long i = 0; i < n; ++i) {
+            a[i] = static_cast<std::uint8_t>(i * 37);
+            positions[i] = static_cast<double>(1 + i * 5 % 8);
+            values[i] = i % 3 == 0;
+        }
+        for (unsigned long limit : {n + 1, 1ul}) {
+            runWithLimit(Record{a.data(), positions.data(), values.get(), out.data(), 1, 1, 1, n, {}},
+                         limit);
+            for (unsigned long i = 0; i < n; ++i)
+                ASSERT_EQ(out[i], Ftor{}(a[i], positions[i], values[i])) << i << " of " << n;
+        }
+    }
 }
 
 }  // namespace
