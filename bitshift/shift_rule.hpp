@@ -72,20 +72,29 @@ struct bitshiftVVFtor {
     // the counts saturated into its lanes (signed, but for an unsigned U).
     // With k the low bits of the count, a count from 0 to width - 1 shifts
     // left by k; one from -width to -1 right by -c, that is by width - k;
-    // one below -width shifts out.
+    // one below -width shifts out. A register whose counts all point one
+    // way (left, as an unsigned U's always do) takes that shift alone.
     __m128i lanes(__m128i x, __m128i c) const noexcept requires lanes::RegisterLanes<T> {
         assert(nbits == static_cast<int>(lanes::bitsOf<T>));
         const __m128i k = _mm_and_si128(c, lanes::repeat<T>(lanes::bitsOf<T> - 1));
-        const lanes::ShiftedBothWays shifted = lanes::shiftBothWaysEach<T>(x, k);
-        const __m128i left = _mm_and_si128(lanes::isBelowWidth<T>(c), shifted.left);
+        const __m128i belowWidth = lanes::isBelowWidth<T>(c);
+        const auto leftOnly = [&] {
+            return _mm_and_si128(belowWidth, lanes::shiftLeftEach<T>(x, k));
+        };
         if constexpr (std::is_unsigned_v<U>) {
-            return left;
+            return leftOnly();
         } else {
+            const __m128i negativeCount = lanes::isNegative<T>(c);
+            const int negatives = _mm_movemask_epi8(negativeCount);
+            if (negatives == 0) return leftOnly();
+            const lanes::ShiftedBothWays shifted = lanes::shiftBothWaysEach<T>(x, k);
             const __m128i out = lanes::isLess<T>(c, lanes::repeat<T>(0u - lanes::bitsOf<T>));
             const __m128i right = std::is_signed_v<T>
                                       ? lanes::select(out, lanes::isNegative<T>(x), shifted.right)
                                       : _mm_andnot_si128(out, shifted.right);
-            return lanes::select(lanes::isNegative<T>(c), right, left);
+            if (negatives == 0xFFFF) return right;
+            const __m128i left = _mm_and_si128(belowWidth, shifted.left);
+            return lanes::select(negativeCount, right, left);
         }
     }
 

@@ -281,4 +281,17 @@ ShiftedBothWays shiftBothWaysEach(__m128i v, __m128i k) noexcept {
     }
 }
 
+// Each lane shifted left by its own count k in [0, width): the low half of
+// the product alone, which needs no sign.
+template <class T>
+__m128i shiftLeftEach(__m128i v, __m128i k) noexcept {
+    if constexpr (sizeof(T) == 1) {
+        return shiftBothWaysEach<T>(v, k).left;
+    } else if constexpr (sizeof(T) == 2) {
+        return _mm_mullo_epi16(v, powerOfTwoEach<T>(k));
+    } else {
+        return each_detail::multiply32(v, powerOfTwoEach<T>(k)).low;
+    }
+}
+
 }  // namespace bitfcns::lanes

@@ -216,6 +216,14 @@ TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
         expectLanesMatchScalar("bitshift", bitshiftVVFtor<T, U>{int(w)}, a, second);
         std::vector<U> positions(b.size());
         for (unsigned long i = 0; i < b.size(); ++i) positions[i] = static_cast<U>(1 + (i * 7 + i / 5) % w);
+        // Counts that all point left, then all right, in whole registers.
+        expectLanesMatchScalar("bitshift left", bitshiftVVFtor<T, U>{int(w)}, a, positions.data());
+        if constexpr (std::is_signed_v<U> || std::is_floating_point_v<U>) {
+            std::vector<U> rightward(positions);
+            for (U& count : rightward) count = static_cast<U>(-count);
+            expectLanesMatchScalar("bitshift right", bitshiftVVFtor<T, U>{int(w)}, a,
+                                   rightward.data());
+        }
         expectLanesMatchScalar("bitget", bitgetVVFtor<T, U>{}, a, positions.data());
         expectLanesMatchScalar("bitset", bitsetVVTFtor<T, U>{}, a, positions.data());
         expectLanesMatchScalar("bitclear", bitsetVVFFtor<T, U>{}, a, positions.data());
