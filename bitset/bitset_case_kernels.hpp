@@ -38,8 +38,9 @@ template <class T>
 }
 
 // A scalar BIT with an array of V: the bit at `bitIndex` (validated) set or
-// cleared by each element of V. In registers when V has A's class, up to 32
-// bits; element by element otherwise.
+// cleared by each element of V. The SIMD pair when V has A's class, up to
+// 32 bits; otherwise the plain loop, a register at a time for A of up to 32
+// bits.
 template <class T, class W>
 [[gnu::noinline]] void bitsetScalarBitKernel(T* out, const T* a, const W* value,
                                              unsigned long strideA, unsigned long strideValue,

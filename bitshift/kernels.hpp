@@ -1,8 +1,9 @@
 // The typed kernels of bitshift on integer values, bitshiftCaseKernel<T, U>
 // for each value class T and count class U, and bitshiftClassDispatch<T>,
 // which picks the kernel by the class of the count. An array of counts runs
-// the shift rule element by element; a scalar count is decided once for the
-// whole array, in the cheapest form that gives the same elements.
+// the shift rule per element (a register at a time for values of up to 32
+// bits); a scalar count is decided once for the whole array, in the
+// cheapest form that gives the same elements.
 //
 // Included by bitshift_instances.cpp only, which instantiates the dispatch
 // for one class of the value per translation unit.
