@@ -94,9 +94,9 @@ template <class T, class U, class W>
                              checkedBitIndex(bit[0], width));
         return;
     }
-    checkPositions(bit, n, width,
-                   strideValue == 0 ? limits::bitsetPositionArrayTrue
-                                    : limits::bitsetPositionValueArrays);
+    checkPositions(
+        bit, n, width,
+        strideValue == 0 ? limits::bitsetPositionArrayTrue : limits::bitsetPositionValueArrays);
     if (strideValue == 0) {
         bitsetPositionArrayKernel(out, a, bit, strideA, strideBit, n, isTrue(value[0]));
     } else if (n != 0) {

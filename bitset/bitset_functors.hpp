@@ -83,8 +83,7 @@ struct bitsetVVVFtor {
         return withMask(a, maskAt<T>(bitIndexOf(b)), isTrue(v));
     }
 
-    __m128i lanes(__m128i a, __m128i b, __m128i v) const noexcept
-        requires lanes::RegisterLanes<T> {
+    __m128i lanes(__m128i a, __m128i b, __m128i v) const noexcept requires lanes::RegisterLanes<T> {
         return setWhereNonZero<T>(a, v, maskLanes<T>(b));
     }
 };

@@ -1,7 +1,7 @@
-// The second operand of a plain loop's vector form, read into the lanes of
-// a register of T (8, 16 or 32 bits wide) whatever its own class: as many
-// elements of U as a register holds of T, each brought to T's lane width
-// the way its functor reads it. U is any integer class, logical, single or
+// The operands after the first of a plain loop's vector form, read into the
+// lanes of a register of T (8, 16 or 32 bits wide) whatever their own class:
+// as many elements of U as a register holds of T, each brought to T's lane
+// width the way its functor reads it. U is any integer class, logical, single or
 // double. Exactly the elements asked for are read, never a byte past them.
 #pragma once
 
@@ -15,7 +15,7 @@
 
 namespace bitfcns::lanes {
 
-// How the elements of a second operand reach the lanes.
+// How the elements of such an operand reach the lanes.
 enum class Reading {
     // Bit positions from 1 to 64, tested before the loop: their value.
     position,
@@ -34,7 +34,8 @@ namespace reading_detail {
 // the integer classes and logical, 32 bits for single and double, which
 // convert to 32-bit integers.
 template <class U>
-inline constexpr int landingBits = std::is_floating_point_v<U> ? 32 : static_cast<int>(8 * sizeof(U));
+inline constexpr int landingBits = std::is_floating_point_v<U> ? 32
+                                                               : static_cast<int>(8 * sizeof(U));
 
 // The low 32 bits of each 64-bit lane of a, then of b.
 inline __m128i lowHalves(__m128i a, __m128i b) noexcept {
@@ -66,8 +67,8 @@ __m128i landFloating(const float* p) noexcept {
         return _mm_castps_si128(_mm_cmpneq_ps(a, _mm_setzero_ps()));
     } else if constexpr (reading == Reading::count) {
         // The largest single below 2^31.
-        const __m128 clamped = _mm_min_ps(_mm_max_ps(a, _mm_set1_ps(-2147483648.0f)),
-                                          _mm_set1_ps(2147483520.0f));
+        const __m128 clamped =
+            _mm_min_ps(_mm_max_ps(a, _mm_set1_ps(-2147483648.0f)), _mm_set1_ps(2147483520.0f));
         return _mm_cvttps_epi32(clamped);
     } else {
         return _mm_cvttps_epi32(a);
@@ -88,7 +89,8 @@ __m128i narrowFrom64(__m128i a, __m128i b) noexcept {
             if constexpr (isSigned) {
                 const __m128i lowSign =
                     _mm_shuffle_epi32(_mm_srai_epi32(v, 31), _MM_SHUFFLE(2, 2, 0, 0));
-                const __m128i bound = _mm_xor_si128(_mm_srai_epi32(high, 31), _mm_set1_epi32(0x7FFFFFFF));
+                const __m128i bound =
+                    _mm_xor_si128(_mm_srai_epi32(high, 31), _mm_set1_epi32(0x7FFFFFFF));
                 return select(_mm_cmpeq_epi32(high, lowSign), v, bound);
             } else {
                 const __m128i highIsZero = _mm_cmpeq_epi32(high, _mm_setzero_si128());

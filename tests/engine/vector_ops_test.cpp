@@ -128,12 +128,13 @@ using i16 = std::int16_t;
 using u16 = std::uint16_t;
 using i32 = std::int32_t;
 using u32 = std::uint32_t;
-using Pairs = ::testing::Types<
-    P<u8, u8>, P<u8, i8>, P<i8, u8>, P<i8, i8>, P<i8, bool>, P<u8, i16>, P<i8, u32>, P<u8, long>,
-    P<i8, unsigned long>, P<u8, double>, P<i8, float>, P<u16, i16>, P<i16, u16>, P<i16, i8>,
-    P<u16, u8>, P<i16, i32>, P<u16, u32>, P<i16, unsigned long>, P<u16, double>, P<i16, bool>,
-    P<u32, i32>, P<i32, u32>, P<i32, i8>, P<u32, u16>, P<i32, long>, P<u32, unsigned long>,
-    P<i32, double>, P<u32, float>, P<i32, bool>>;
+using Pairs =
+    ::testing::Types<P<u8, u8>, P<u8, i8>, P<i8, u8>, P<i8, i8>, P<i8, bool>, P<u8, i16>,
+                     P<i8, u32>, P<u8, long>, P<i8, unsigned long>, P<u8, double>, P<i8, float>,
+                     P<u16, i16>, P<i16, u16>, P<i16, i8>, P<u16, u8>, P<i16, i32>, P<u16, u32>,
+                     P<i16, unsigned long>, P<u16, double>, P<i16, bool>, P<u32, i32>, P<i32, u32>,
+                     P<i32, i8>, P<u32, u16>, P<i32, long>, P<u32, unsigned long>, P<i32, double>,
+                     P<u32, float>, P<i32, bool>>;
 TYPED_TEST_SUITE(VectorForms, Pairs);
 
 // Every pair of 8-bit elements; for wider ones every pair of edge values
@@ -146,7 +147,8 @@ void operandPairs(std::vector<T>& a, std::vector<U>& b) {
                    max = std::numeric_limits<T>::max();
     std::vector<long> edges{0,     1,  2,      -1,  w - 1,   w,       w + 1,
                             1 - w, -w, -w - 1, min, min + 1, max - 1, max};
-    for (long wrap : {0x100l, 0x10000l, 0x100000000l}) edges.insert(edges.end(), {wrap + 3, -wrap - 3});
+    for (long wrap : {0x100l, 0x10000l, 0x100000000l})
+        edges.insert(edges.end(), {wrap + 3, -wrap - 3});
     std::vector<U> ends{std::numeric_limits<U>::lowest(), std::numeric_limits<U>::max()};
     if (std::is_same_v<T, U> && w == 8) {
         edges.resize(256);
@@ -161,7 +163,8 @@ void operandPairs(std::vector<T>& a, std::vector<U>& b) {
     while (a.size() % 16 != 0 || a.size() < 20000) {
         a.push_back(static_cast<T>(random()));
         const auto r = random();
-        b.push_back(static_cast<U>(r % 2 ? static_cast<long>(r) : static_cast<long>(r % (4 * w)) - 2 * w));
+        b.push_back(
+            static_cast<U>(r % 2 ? static_cast<long>(r) : static_cast<long>(r % (4 * w)) - 2 * w));
     }
 }
 
@@ -174,7 +177,8 @@ void expectLanesMatchScalar(const char* name, const Ftor& ftor, const std::vecto
     T results[count];
     const auto lanesAt = [&]<std::size_t... k>(unsigned long i, std::index_sequence<k...>) {
         const __m128i va = _mm_loadu_si128(reinterpret_cast<const __m128i*>(a.data() + i));
-        return ftor.lanes(va, lanes::readLanesOf<T, plain_detail::readingOf<Ftor, k>()>(more + i)...);
+        return ftor.lanes(va,
+                          lanes::readLanesOf<T, plain_detail::readingOf<Ftor, k>()>(more + i)...);
     };
     for (unsigned long i = 0; i < a.size(); i += count) {
         _mm_storeu_si128(reinterpret_cast<__m128i*>(results),
@@ -205,7 +209,9 @@ TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
         // Truth values only: a NaN is true, -0.0 false.
         std::vector<U> truths(b);
         for (unsigned long i = 0; i < truths.size(); i += 7)
-            truths[i] = i % 3 == 0 ? std::numeric_limits<U>::quiet_NaN() : i % 3 == 1 ? U(-0.0) : U(0.5);
+            truths[i] = i % 3 == 0   ? std::numeric_limits<U>::quiet_NaN()
+                        : i % 3 == 1 ? U(-0.0)
+                                     : U(0.5);
         for (std::uint32_t bit = 0; bit < w; bit += 3)
             expectLanesMatchScalar("bitset", IntBitsetFtor<T, U>(bit), a, truths.data());
     }
@@ -215,7 +221,8 @@ TYPED_TEST(VectorForms, LanesMatchTheScalarFunctor) {
     if constexpr (!std::is_same_v<U, bool>) {
         expectLanesMatchScalar("bitshift", bitshiftVVFtor<T, U>{int(w)}, a, second);
         std::vector<U> positions(b.size());
-        for (unsigned long i = 0; i < b.size(); ++i) positions[i] = static_cast<U>(1 + (i * 7 + i / 5) % w);
+        for (unsigned long i = 0; i < b.size(); ++i)
+            positions[i] = static_cast<U>(1 + (i * 7 + i / 5) % w);
         // Counts that all point left, then all right, in whole registers.
         expectLanesMatchScalar("bitshift left", bitshiftVVFtor<T, U>{int(w)}, a, positions.data());
         if constexpr (std::is_signed_v<U> || std::is_floating_point_v<U>) {
@@ -294,8 +301,9 @@ TEST(VectorLoop, ThreeInputRunsMatchTheScalarFunctor) {
             values[i] = i % 3 == 0;
         }
         for (unsigned long limit : {n + 1, 1ul}) {
-            runWithLimit(Record{a.data(), positions.data(), values.get(), out.data(), 1, 1, 1, n, {}},
-                         limit);
+            runWithLimit(
+                Record{a.data(), positions.data(), values.get(), out.data(), 1, 1, 1, n, {}},
+                limit);
             for (unsigned long i = 0; i < n; ++i)
                 ASSERT_EQ(out[i], Ftor{}(a[i], positions[i], values[i])) << i << " of " << n;
         }
