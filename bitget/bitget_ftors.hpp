@@ -110,9 +110,8 @@ struct bitgetVVFtor {
     }
 
     __m128i lanes(__m128i a, __m128i p) const noexcept requires lanes::RegisterLanes<T> {
-        const __m128i one = lanes::repeat<T>(1);
-        const __m128i bit = lanes::powerOfTwoEach<T>(lanes::subtract<T>(p, one));
-        return _mm_andnot_si128(lanes::isZero<T>(_mm_and_si128(a, bit)), one);
+        const __m128i bit = lanes::bitOfPositionEach<T>(p);
+        return _mm_andnot_si128(lanes::isZero<T>(_mm_and_si128(a, bit)), lanes::repeat<T>(1));
     }
 };
 

@@ -63,12 +63,6 @@ bool isTrue(W v) noexcept {
     return v != W{};
 }
 
-// The mask of bit b - 1 in each lane of T, b a valid position in the lane.
-template <class T>
-__m128i maskLanes(__m128i b) noexcept {
-    return lanes::powerOfTwoEach<T>(lanes::subtract<T>(b, lanes::repeat<T>(1)));
-}
-
 // a with bit b set where v is true and cleared where it is false; BIT and V
 // both arrays. The type of BIT is the call operator's own. lanes() does the
 // same to a register of T of up to 32 bits.
@@ -84,7 +78,7 @@ struct bitsetVVVFtor {
     }
 
     __m128i lanes(__m128i a, __m128i b, __m128i v) const noexcept requires lanes::RegisterLanes<T> {
-        return setWhereNonZero<T>(a, v, maskLanes<T>(b));
+        return setWhereNonZero<T>(a, v, lanes::bitOfPositionEach<T>(b));
     }
 };
 
@@ -98,7 +92,7 @@ struct bitsetVVTFtor {
     T operator()(T a, U b) const noexcept { return withMask(a, maskAt<T>(bitIndexOf(b)), true); }
 
     __m128i lanes(__m128i a, __m128i b) const noexcept requires lanes::RegisterLanes<T> {
-        return _mm_or_si128(a, maskLanes<T>(b));
+        return _mm_or_si128(a, lanes::bitOfPositionEach<T>(b));
     }
 };
 
@@ -111,7 +105,7 @@ struct bitsetVVFFtor {
     T operator()(T a, U b) const noexcept { return withMask(a, maskAt<T>(bitIndexOf(b)), false); }
 
     __m128i lanes(__m128i a, __m128i b) const noexcept requires lanes::RegisterLanes<T> {
-        return _mm_andnot_si128(maskLanes<T>(b), a);
+        return _mm_andnot_si128(lanes::bitOfPositionEach<T>(b), a);
     }
 };
 

@@ -11,7 +11,6 @@
 #include <concepts>
 #include <cstdint>
 #include <type_traits>
-#include <utility>
 
 namespace bitfcns::lanes {
 
@@ -232,6 +231,13 @@ __m128i powerOfTwoEach(__m128i k) noexcept {
     } else {
         return powerOfTwo32(k);
     }
+}
+
+// The bit of position p (bit p - 1) alone in each lane, every p from 1 to
+// the width.
+template <class T>
+__m128i bitOfPositionEach(__m128i p) noexcept {
+    return powerOfTwoEach<T>(subtract<T>(p, repeat<T>(1)));
 }
 
 // Each lane shifted left by its count k and, apart, right by width - k
