@@ -92,8 +92,9 @@ void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, z
     const double* counts = dataOf<const double>(second);
     double* out = dataOf<double>(result);
     if (secondIsScalar && shiftByOneCount<T>(values, *counts, out, n)) return;
-    // A 64-bit pattern shifted left goes back to a double by exponent sums
-    // that cost more in lanes than the plain loop's scalar conversions.
+    // For 64-bit classes the lanes, which test, shift and wrap two elements
+    // by counts of their own, run slower than the plain loop's scalar
+    // conversions, at every size measured.
     if constexpr (sizeof(T) < 8) {
         if (!firstIsScalar && !secondIsScalar &&
             runCheckedLanes(BitshiftCountsLanes<T>{}, values, counts, out, n, &runInRanges))

@@ -135,35 +135,38 @@ struct BitshiftFtor {
 enum class DoubleShift { left, right, out };
 
 // BitshiftFtor<T> by one whole count, as a lane kernel of the double path's
-// checked loop. Left: the pattern in T shifted, read back as T. Right: the
-// floor of x / 2^k, which is the shift of either kind of T and a double
-// already. Out: -1 for a negative x shifted right, 0 otherwise (the fill is
-// the pattern of -1.0 for a negative count).
+// checked loop. Left: x * 2^k wrapped into T, for 64-bit T in doubles, for
+// narrower T as the shifted pattern read back as T. Right: the floor of
+// x / 2^k, which is the shift of either kind of T and a double already.
+// Out: -1 for a negative x shifted right, 0 otherwise (the fill is the
+// pattern of -1.0 for a negative count).
 template <class T, DoubleShift kind>
 struct BitshiftLanes {
     static constexpr int arity = 1;
     static constexpr unsigned long parallelLimit = limits::bitshiftOnDouble;
 
     scan_detail::LaneTest<T> fits;
-    __m128i leftCount;   // in the low 64 bits
-    __m128d rightScale;  // 2^-k
-    __m128d fill;        // -1.0 or 0.0, kept where x is negative
+    __m128i leftCount;  // in the low 64 bits
+    __m128d scale;      // 2^count
+    __m128d fill;       // -1.0 or 0.0, kept where x is negative
 
     // `count` as the shift rule takes it: k > 0 shifts left, k <= 0 right by
     // -k; for `out` any count at or beyond the width.
     explicit BitshiftLanes(double count) noexcept
         : leftCount(_mm_cvtsi32_si128(kind == DoubleShift::left ? static_cast<int>(count) : 0)),
-          rightScale(lanes::broadcast(
-              kind == DoubleShift::right ? std::ldexp(1.0, static_cast<int>(count)) : 1.0)),
+          scale(lanes::broadcast(kind == DoubleShift::out ? 1.0
+                                                          : std::ldexp(1.0, static_cast<int>(count)))),
           fill(lanes::broadcast(count < 0 ? -1.0 : 0.0)) {}
 
     __m128d check(__m128d x) const noexcept { return fits(x); }
 
     __m128d apply(__m128d x) const noexcept {
-        if constexpr (kind == DoubleShift::left) {
+        if constexpr (kind == DoubleShift::left && sizeof(T) == 8) {
+            return lanes::wrapShiftedLeft64<T>(_mm_mul_pd(x, scale));
+        } else if constexpr (kind == DoubleShift::left) {
             return lanes::fromPattern<T>(_mm_sll_epi64(lanes::patternOf<T>(x), leftCount));
         } else if constexpr (kind == DoubleShift::right) {
-            const __m128d scaled = _mm_mul_pd(x, rightScale);
+            const __m128d scaled = _mm_mul_pd(x, scale);
             return sizeof(T) == 8 ? lanes::floorFinite(scaled) : lanes::floorBelow2To51(scaled);
         } else {
             return _mm_and_pd(_mm_cmplt_pd(x, _mm_setzero_pd()), fill);

@@ -110,6 +110,38 @@ __m128d fromPattern(__m128i v) noexcept {
     }
 }
 
+// Each lane y = x * 2^k, x a whole number of a 64-bit class T and 0 < k < 64,
+// wrapped into T's range: the two's complement shift of x to the left, as a
+// double, computed without leaving doubles. Everything is exact:
+// - the magic sum rounds y to the nearest multiple n of 2^64, as the doubles
+//   from 2^116 to 2^117 are 2^64 apart; y - n lies in [-2^63, 2^63], a
+//   multiple of y's own spacing, so a double holds it;
+// - the wrapped value keeps at most x's 53 significant bits, so a double
+//   holds it too, and the last step to T's range (adding or taking 2^64)
+//   lands on it exactly, and turns the -0 of a zero x into +0;
+// - from 2^116 up, y is a multiple of 2^64 and every bit is shifted out.
+template <class T>
+__m128d wrapShiftedLeft64(__m128d y) noexcept {
+    static_assert(sizeof(T) == 8);
+    constexpr double twoTo63 = 9223372036854775808.0;
+    constexpr double twoTo64 = 18446744073709551616.0;
+    constexpr double twoTo116 = 83076749736557242056487941267521536.0;
+    const __m128d signBit = broadcast(-0.0);
+    const __m128d magic = std::is_signed_v<T>
+                              ? _mm_or_pd(_mm_and_pd(signBit, y), broadcast(twoTo116))
+                              : broadcast(twoTo116);
+    const __m128d nearest = _mm_sub_pd(_mm_add_pd(y, magic), magic);
+    const __m128d wrapped = _mm_sub_pd(y, nearest);
+    const __m128d inRange =
+        std::is_signed_v<T>
+            ? _mm_add_pd(wrapped, _mm_and_pd(_mm_cmpge_pd(wrapped, broadcast(twoTo63)),
+                                             broadcast(-twoTo64)))
+            : _mm_add_pd(wrapped, _mm_and_pd(_mm_cmplt_pd(wrapped, _mm_setzero_pd()),
+                                             broadcast(twoTo64)));
+    const __m128d magnitude = std::is_signed_v<T> ? _mm_andnot_pd(signBit, y) : y;
+    return _mm_and_pd(_mm_cmplt_pd(magnitude, broadcast(twoTo116)), inRange);
+}
+
 // Each lane, a whole number from -2^31 to below 2^31, as a 64-bit integer
 // lane that holds it zero-extended from 32 bits: a count for the shifts
 // below when it isn't negative, and one of 2^32 or more (which shifts
