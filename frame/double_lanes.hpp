@@ -55,18 +55,20 @@ inline __m128d floorFinite(__m128d y) noexcept {
     return _mm_or_pd(_mm_and_pd(small, floor), _mm_andnot_pd(small, y));
 }
 
-// The 64-bit two's complement pattern of each lane, a whole number from
-// -2^63 to below 2^64: each lane converted on its own by the scalar
-// truncating conversion, which takes -2^63 to below 2^63; from 2^63 up
-// (uint64 only) x less 2^64, exact there and of the same pattern, takes its
-// place. A lane outside the range gives the conversion's indefinite value.
+// The 64-bit two's complement pattern of each lane, a whole number x from
+// -2^63 to below 2^64, made in registers as hi * 2^32 + lo: hi, x / 2^32
+// rounded to nearest by the magic sum, holds the high word and lo = x - hi *
+// 2^32, exact and within +-2^31, the low one. The magic sum's pattern less
+// that of the magic is lo sign-extended to 64 bits, and the sum of the two
+// parts wraps modulo 2^64 as the pattern does (hi reaching 2^32 near 2^64
+// included). A lane outside the range gives meaningless bits.
 inline __m128i pattern64(__m128d x) noexcept {
-    const __m128d twoTo63 = broadcast(9223372036854775808.0);
-    const __m128d twoTo64 = broadcast(18446744073709551616.0);
-    const __m128d wrapped = _mm_sub_pd(x, _mm_and_pd(_mm_cmpge_pd(x, twoTo63), twoTo64));
-    const __m128i low = _mm_cvtsi64_si128(_mm_cvttsd_si64(wrapped));
-    const __m128i high = _mm_cvtsi64_si128(_mm_cvttsd_si64(_mm_unpackhi_pd(wrapped, wrapped)));
-    return _mm_unpacklo_epi64(low, high);
+    const __m128d magic = broadcast(lowWordMagic);
+    const __m128d highSum = _mm_add_pd(_mm_mul_pd(x, broadcast(1.0 / twoTo32)), magic);
+    const __m128d high = _mm_mul_pd(_mm_sub_pd(highSum, magic), broadcast(twoTo32));
+    const __m128i low = _mm_sub_epi64(_mm_castpd_si128(_mm_add_pd(_mm_sub_pd(x, high), magic)),
+                                      _mm_castpd_si128(magic));
+    return _mm_add_epi64(_mm_slli_epi64(_mm_castpd_si128(highSum), 32), low);
 }
 
 // The pattern of each lane in T: all 64 bits for the 64-bit classes, the
