@@ -80,10 +80,9 @@ bool shiftByOneCount(const double* values, double count, double* out, unsigned l
 // Validates the values for class T and the counts, then shifts into
 // `result`, refusing a bad value before a bad count. In place every element
 // is tested before any is written, so a refused call leaves values whose
-// storage the result shares untouched; a fresh result by one count, or by
-// an array of counts for a class of up to 32 bits, is tested and written in
-// one pass. A scalar operand is tested even when the
-// other is empty.
+// storage the result shares untouched; a fresh result by one count or by
+// an array of counts is tested and written in one pass. A scalar operand is
+// tested even when the other is empty.
 template <class T>
 void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, zqArray_tag* result,
                           bool firstIsScalar, bool secondIsScalar) {
@@ -92,14 +91,9 @@ void bitshiftDoubleDriver(const zqArray_tag* first, const zqArray_tag* second, z
     const double* counts = dataOf<const double>(second);
     double* out = dataOf<double>(result);
     if (secondIsScalar && shiftByOneCount<T>(values, *counts, out, n)) return;
-    // For 64-bit classes the lanes, which test, shift and wrap two elements
-    // by counts of their own, run slower than the plain loop's scalar
-    // conversions, at every size measured.
-    if constexpr (sizeof(T) < 8) {
-        if (!firstIsScalar && !secondIsScalar &&
-            runCheckedLanes(BitshiftCountsLanes<T>{}, values, counts, out, n, &runInRanges))
-            return;
-    }
+    if (!firstIsScalar && !secondIsScalar &&
+        runCheckedLanes(BitshiftCountsLanes<T>{}, values, counts, out, n, &runInRanges))
+        return;
     const ScanRunner runner{limits::bitshiftOnDouble, &runInRanges};
     if (!allFitInteger<T>(values, firstIsScalar ? 1 : n, runner)) raiseError<errors::outOfRange>();
     if (!allWholeCounts(counts, secondIsScalar ? 1 : n, runner))
