@@ -195,11 +195,19 @@ struct BitshiftCountsLanes {
     __m128d apply(__m128d x, __m128d c) const noexcept {
         // For 64-bit T the element functor, lane by lane, runs faster than
         // any lane arithmetic tried (the pattern's shifts, or x * 2^k
-        // wrapped in doubles), at every size measured.
+        // wrapped in doubles), at every size measured. A lane that check
+        // refuses reaches it too, so x is first held within T's range
+        // (NaN going to the top), where its conversion is defined; a
+        // count needs nothing, the functor converts only those within the
+        // width.
         if constexpr (sizeof(T) == 8) {
+            using Bounds = IntegerBounds<T>;
+            constexpr double top = Bounds::highest * (1.0 - 0x1p-53);  // the double below
+            const __m128d held = _mm_max_pd(_mm_min_pd(x, lanes::broadcast(top)),
+                                            lanes::broadcast(Bounds::lowest));
             const BitshiftFtor<T> shift;
-            return _mm_setr_pd(shift(_mm_cvtsd_f64(x), _mm_cvtsd_f64(c)),
-                               shift(_mm_cvtsd_f64(_mm_unpackhi_pd(x, x)),
+            return _mm_setr_pd(shift(_mm_cvtsd_f64(held), _mm_cvtsd_f64(c)),
+                               shift(_mm_cvtsd_f64(_mm_unpackhi_pd(held, held)),
                                      _mm_cvtsd_f64(_mm_unpackhi_pd(c, c))));
         } else {
             return applyWithin32(x, c);
