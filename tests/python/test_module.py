@@ -60,17 +60,8 @@ def layouts(base):
     }
 
 
-@pytest.mark.parametrize("layout", list(layouts(np.zeros((2, 2), np.int32))))
-def test_every_layout_gives_the_c_ordered_result(layout):
-    base = np.arange(-6, 6, dtype=np.int32).reshape(3, 4) * 7919
-    operand = layouts(base)[layout]
-    np.testing.assert_array_equal(operand, np.ascontiguousarray(operand))
-    np.testing.assert_array_equal(bitfcns.bitxor(operand, base[:1]), operand ^ base[:1])
-    np.testing.assert_array_equal(bitfcns.bitcmp(operand), ~base)
-
-
 def test_overwrite_input_takes_over_a_writeable_c_ordered_operand_only():
-    fresh = lambda: np.arange(12, dtype=np.uint16).reshape(3, 4)  # noqa: E731
+    fresh = lambda: (np.arange(12, dtype=np.uint16) * 7919).reshape(3, 4)  # noqa: E731
     a = fresh()
     kept = bitfcns.bitcmp(a)
     assert not np.shares_memory(kept, a)
@@ -80,6 +71,7 @@ def test_overwrite_input_takes_over_a_writeable_c_ordered_operand_only():
     assert np.shares_memory(taken, a)
     np.testing.assert_array_equal(a, ~fresh())
 
+    # Every layout reads as its C-ordered copy would, taken over or not.
     for name, other in layouts(fresh()).items():
         original = other.copy()
         result = bitfcns.bitcmp(other, overwrite_input=True)
