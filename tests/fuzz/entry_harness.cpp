@@ -476,8 +476,10 @@ void compare(const Call& call, const reference::Outcome& expected, const Run& ru
             check(shares == (expected.sharesFirst && i == 0),
                   "storage sharing with operand " + std::to_string(i));
         }
-    } else if (!expected.slotFilled) {
-        check(run.slot.get() == run.sentinel, "a refusal changed plhs[0]");
+    } else {
+        check((run.slot.get() != run.sentinel) == expected.slotFilled,
+              expected.slotFilled ? "a refusal left no result in plhs[0]"
+                                  : "a refusal changed plhs[0]");
     }
     for (std::size_t i = 0; i < run.operands.size(); ++i) {
         const zqArray_tag& a = *run.operands[i];
