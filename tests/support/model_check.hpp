@@ -11,6 +11,7 @@
 #include <cmath>
 #include <cstdint>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 namespace testing_support {
@@ -83,6 +84,16 @@ std::vector<double> edgeDoublesOf() {
         v.push_back(low < 0 && (s & 1024) ? -m : m);
     }
     return v;
+}
+
+// `values` with each whole number from `first` to `last` in turn: arrays that
+// pair every value with every number, so that neighbouring elements differ.
+inline std::pair<zqArraySlot, zqArraySlot> pairedWithEach(const std::vector<double>& values,
+                                                          double first, double last) {
+    std::vector<double> paired, numbers;
+    for (double x : values)
+        for (double k = first; k <= last; ++k) paired.push_back(x), numbers.push_back(k);
+    return {makeOf(paired), makeOf(numbers)};
 }
 
 // T's class name, the assumed type of a double path.
