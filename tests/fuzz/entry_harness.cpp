@@ -394,22 +394,17 @@ Run runOnce(const Call& call) {
     return run;
 }
 
+// For the report of a fault: up to 64 bytes in hex, and sizes as AxBxC.
 std::string hexOf(const unsigned char* bytes, std::size_t count) {
     std::string text;
-    char digits[4];
-    for (std::size_t i = 0; i < count && i < 64; ++i) {
-        std::snprintf(digits, sizeof digits, "%02x", bytes[i]);
-        text += digits;
-    }
+    for (std::size_t i = 0; i < count && i < 64; ++i)
+        for (int shift : {4, 0}) text += "0123456789abcdef"[bytes[i] >> shift & 15];
     return text + (count > 64 ? "..." : "");
 }
 
 std::string dimsText(const Dims& dims) {
     std::string text;
-    for (unsigned long d : dims) {
-        if (!text.empty()) text += 'x';
-        text += std::to_string(d);
-    }
+    for (unsigned long d : dims) text.append(text.empty() ? "" : "x").append(std::to_string(d));
     return text.empty() ? "(no sizes)" : text;
 }
 

@@ -109,7 +109,7 @@ def test_results_and_operands_outlive_each_other():
     np.testing.assert_array_equal(view, ~np.arange(10, 20))
 
 
-def test_refusals_carry_identifier_and_sentence_and_bad_calls_are_type_errors():
+def test_refusals_carry_identifier_and_sentence_other_errors_are_python_ones():
     with pytest.raises(bitfcns.BitfcnsError) as raised:
         bitfcns.bitcmp(np.array([1.5]))
     error = raised.value
@@ -124,11 +124,8 @@ def test_refusals_carry_identifier_and_sentence_and_bad_calls_are_type_errors():
         bitfcns.bitcmp(1.0, "uint8", "uint8")
     with pytest.raises(TypeError, match="unexpected keyword argument 'overwrite'"):
         bitfcns.bitand(1.0, 1.0, overwrite=True)
-
-
-def test_allocation_failure_is_a_memory_error():
     column = np.zeros((1 << 24, 1), np.uint8)
-    with pytest.raises(MemoryError):
+    with pytest.raises(MemoryError):  # an allocation failure
         bitfcns.bitand(column, column.T)  # 2**48 bytes
 
 
