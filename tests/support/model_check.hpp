@@ -22,10 +22,10 @@ inline zqArraySlot flagged(zqArraySlot array, bool inPlace = true) {
     return array;
 }
 
-// The model's outcome: the same refusal, with the slot filled only where the
-// model fills it and every operand as it was; or the same class, sizes and
+// The model's outcome: the same refusal, or the same class, sizes and
 // elements, taking over the first operand's storage exactly when the model
-// does. Either way no array record is left behind.
+// does; and no array record left behind. (What a refused call leaves in its
+// operands and in plhs[0] is the fuzz harness's to check.)
 inline void expectModelOutcome(reference::Function function, EntryPoint entry,
                                const std::vector<const zqArray_tag*>& inputs) {
     const std::size_t liveBefore = host::liveArrayCount();
@@ -44,15 +44,7 @@ inline void expectModelOutcome(reference::Function function, EntryPoint entry,
         zqArraySlot result;
         ASSERT_EQ(callEntry(entry, inputs, &result), expected.error)
             << "the library, then the model";
-        if (!expected.error.empty()) {
-            EXPECT_EQ(result != nullptr, expected.slotFilled);
-            for (std::size_t i = 0; i < inputs.size(); ++i) {
-                const auto* now = static_cast<const unsigned char*>(inputs[i]->data);
-                EXPECT_TRUE(std::equal(operands[i].bytes.begin(), operands[i].bytes.end(), now))
-                    << "a refused call changed operand " << i;
-            }
-            return;
-        }
+        if (!expected.error.empty()) return;
         ASSERT_EQ(host::classOf(*result), expected.cls);
         ASSERT_EQ(host::dimensions(*result), expected.dims);
         EXPECT_EQ(host::storageIdentity(*result) == host::storageIdentity(*inputs[0]),
