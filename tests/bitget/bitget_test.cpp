@@ -1,9 +1,9 @@
 // bitget through its entry point against the reference model: one below and
 // at each parallel limit, fresh and in place (one position by the SIMD
 // family, an array of positions by the plain loop, double values under an
-// assumed type); and refused calls, which write nothing into flagged storage
-// and fill the slot only where the double path put its result there before
-// the refusal. Every class pairing is checked by the fuzz target.
+// assumed type), and doubles at the edges of every class. Every class
+// pairing, and refused calls (nothing written into flagged storage, the slot
+// filled only where the model fills it), are checked by the fuzz target.
 #include "bitfcns/entry_points.hpp"
 #include "engine/parallel_limits.hpp"
 #include "host/host_control.hpp"
@@ -55,13 +55,8 @@ TYPED_TEST(IntegerValues, DoubleEdgesAtEveryPosition) {
     const auto values = makeOf(edges), type = classNameOf<TypeParam>();
     for (double p = 1; p <= width; ++p)
         expectAsModel({values.get(), scalarOf(p).get(), type.get()});
-    std::vector<double> pairedValues, pairedPositions;
-    for (double x : edges)
-        for (double p = 1; p <= width; ++p) {
-            pairedValues.push_back(x);
-            pairedPositions.push_back(p);
-        }
-    expectAsModel({makeOf(pairedValues).get(), makeOf(pairedPositions).get(), type.get()});
+    const auto [pairedValues, positions] = pairedWithEach(edges, 1, width);
+    expectAsModel({pairedValues.get(), positions.get(), type.get()});
 }
 
 TEST(DoubleValues, SerialAndParallelRunsFreshAndInPlace) {
@@ -75,24 +70,6 @@ TEST(DoubleValues, SerialAndParallelRunsFreshAndInPlace) {
         for (bool inPlace : {false, true})
             expectAsModel({flagged(makeOf(values), inPlace).get(), p.get(), int16.get()});
     }
-}
-
-// Flagged operands throughout, so any write into them shows.
-TEST(Refusals, WriteNothingAndFillTheSlotOnlyWhereTheModelDoes) {
-    const auto d = [](std::vector<double> v) { return flagged(makeOf(v)); };
-    const auto u8 = [](std::vector<unsigned char> v) { return flagged(makeOf(v)); };
-    const auto text = [](std::u16string_view t) { return host::makeCharArray(t); };
-    int index = 0;
-    const auto call = [&](zqArraySlot a, zqArraySlot p, zqArraySlot type = nullptr) {
-        SCOPED_TRACE(testing::Message() << "call " << ++index);
-        std::vector<const zqArray_tag*> inputs{a.get(), p.get()};
-        if (type) inputs.push_back(type.get());
-        expectAsModel(inputs);
-    };
-    call(d({1, 256}), d({9, 1}), text(u"uint8"));
-    call(flagged(makeOf<double>({}, {0, 2})), d({0}));
-    call(u8({5, 6, 7}), d({1, 8, 9}));  // the last position is tested before any write
-    call(d({1, 2, 3}), d({1, 2, 0}));
 }
 
 }  // namespace

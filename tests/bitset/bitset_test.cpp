@@ -1,8 +1,8 @@
 // bitset through its entry point against the reference model: one run below
-// the limit of each route and one at it, fresh and in place, and a refused
-// call that writes nothing. The call forms, the truth of V and every class
-// combination are checked against the model by the fuzz target; the engine's
-// tests take the SIMD families through every width.
+// the limit of each route and one at it, fresh and in place, and doubles at
+// the edges of every class. The call forms, the truth of V, every class
+// combination and refused calls are checked against the model by the fuzz
+// target; the engine's tests take the SIMD families through every width.
 #include "bitfcns/entry_points.hpp"
 #include "engine/parallel_limits.hpp"
 #include "tests/support/model_check.hpp"
@@ -89,13 +89,7 @@ TYPED_TEST(EveryClass, DoubleEdgesAtEveryPosition) {
     constexpr double width = sizeof(TypeParam) * 8;
     const std::vector<double> edges = edgeDoublesOf<TypeParam>();
     const auto values = makeOf(edges), type = classNameOf<TypeParam>();
-    std::vector<double> pairedValues, pairedPositions;
-    for (double x : edges)
-        for (double p = 1; p <= width; ++p) {
-            pairedValues.push_back(x);
-            pairedPositions.push_back(p);
-        }
-    const auto manyValues = makeOf(pairedValues), manyPositions = makeOf(pairedPositions);
+    const auto [manyValues, manyPositions] = pairedWithEach(edges, 1, width);
     std::vector<double> mixed(edges.size());  // V for each element: set, clear, clear, ...
     for (std::size_t i = 0; i < mixed.size(); ++i) mixed[i] = i % 3 == 0;
     const auto mixedValues = makeOf(mixed);
@@ -107,13 +101,6 @@ TYPED_TEST(EveryClass, DoubleEdgesAtEveryPosition) {
             expectAsModel({values.get(), scalarOf(p).get(), value.get(), type.get()});
         expectAsModel({manyValues.get(), manyPositions.get(), value.get(), type.get()});
     }
-}
-
-// The bad position stands last, after every other has been converted.
-TEST(Bitset, RefusedCallWritesNothingIntoFlaggedStorage) {
-    const auto a = flagged(randomOf(zqUInt8Class, 5));
-    expectAsModel({a.get(), makeOf<unsigned char>({1, 2, 3, 4, 9}).get(),
-                   makeOf<short>({1, 0, 1, 0, 1}).get()});
 }
 
 }  // namespace

@@ -1,9 +1,9 @@
 // The parallel driver: one serial call on the calling thread below its limit,
-// subranges covering the run exactly once from it; the plain records, whose
-// elements are the same in one serial call and split down to single
-// elements, with every input broadcast or not; and the vector forms of the
-// plain functors, lane for lane against their scalar operator(), alone and
-// through a record at every placement.
+// subranges covering the run exactly once from it; and the vector forms of
+// the plain functors, lane for lane against their scalar operator(), alone
+// and through a record at every placement. The element loop (broadcasts,
+// three inputs) is checked through bitget's, bitset's and bitshift's entry
+// points against the reference model, at and below each parallel limit.
 #include "engine/vector_ops.hpp"
 #include "bitget/bitget_ftors.hpp"
 #include "bitset/bitset_functors.hpp"
@@ -15,7 +15,6 @@
 #include <algorithm>
 #include <cstdint>
 #include <limits>
-#include <memory>
 #include <mutex>
 #include <numeric>
 #include <random>
@@ -65,54 +64,9 @@ TEST(ParallelDriver, SerialBelowTheLimitSplitFromIt) {
     }
 }
 
-struct WeightedSum {
-    unsigned long operator()(unsigned long a) const { return 3 * a + 1; }
-    unsigned long operator()(unsigned long a, short b) const {
-        return 3 * a + static_cast<unsigned long>(b);
-    }
-    unsigned long operator()(unsigned long a, short b, bool c) const {
-        return c ? (*this)(a, b) : a - static_cast<unsigned long>(b);
-    }
-};
-
 template <class Record>
 void runWithLimit(const Record& record, unsigned long limit) {
     runInRanges(record.n, limit, &runRecordRange<Record>, &record);
-}
-
-TEST(PlainVectorOps, SerialAndSplitRunsAgree) {
-    constexpr unsigned long n = 1001;
-    std::vector<unsigned long> a(n);
-    std::vector<short> b(n);
-    const std::unique_ptr<bool[]> flags(new bool[n]);
-    for (unsigned long i = 0; i < n; ++i) {
-        a[i] = i * 0x9E3779B97F4A7C15u;
-        b[i] = static_cast<short>(i * 40503);
-        flags[i] = i % 3 == 0;
-    }
-    for (unsigned long strides = 0; strides < 8; ++strides)
-        for (unsigned long limit : {n + 1, 1ul}) {
-            const unsigned long s1 = strides & 1, s2 = strides >> 1 & 1, s3 = strides >> 2;
-            SCOPED_TRACE(testing::Message() << "strides " << s1 << s2 << s3 << " limit " << limit);
-            std::vector<unsigned long> one(n), two(n), three(n);
-            runWithLimit(
-                bitfcnsOneInputVectorOp<unsigned long, WeightedSum>{
-                    a.data(), one.data(), s1, n, {}},
-                limit);
-            runWithLimit(
-                bitfcnsTwoInputVectorOp<unsigned long, short, WeightedSum>{
-                    a.data(), b.data(), two.data(), s1, s2, n, {}},
-                limit);
-            runWithLimit(
-                bitfcnsThreeInputVectorOp<unsigned long, short, bool, WeightedSum>{
-                    a.data(), b.data(), flags.get(), three.data(), s1, s2, s3, n, {}},
-                limit);
-            for (unsigned long i = 0; i < n; ++i) {
-                ASSERT_EQ(one[i], WeightedSum{}(a[i * s1])) << i;
-                ASSERT_EQ(two[i], WeightedSum{}(a[i * s1], b[i * s2])) << i;
-                ASSERT_EQ(three[i], WeightedSum{}(a[i * s1], b[i * s2], flags[i * s3])) << i;
-            }
-        }
 }
 
 // Element types (value, second operand) of the vector forms: values of 8,
@@ -284,30 +238,6 @@ TEST(VectorLoop, RunsAtEveryPlacementMatchTheScalarFunctor) {
     expectEveryPlacementToMatch<std::int8_t, std::int8_t>();
     expectEveryPlacementToMatch<std::uint8_t, double>();
     expectEveryPlacementToMatch<std::int32_t, std::int8_t>();
-}
-
-// A three-input record, in one run and split, over inputs of exactly n
-// elements: the values, double positions and logical new bits.
-TEST(VectorLoop, ThreeInputRunsMatchTheScalarFunctor) {
-    using Ftor = bitsetVVVFtor<std::uint8_t, bool>;
-    using Record = bitfcnsThreeInputVectorOp<std::uint8_t, double, bool, Ftor>;
-    for (unsigned long n : {0ul, 15ul, 16ul, 1000ul, 1001ul}) {
-        std::vector<std::uint8_t> a(n), out(n);
-        std::vector<double> positions(n);
-        const std::unique_ptr<bool[]> values(new bool[n]);
-        for (unsigned long i = 0; i < n; ++i) {
-            a[i] = static_cast<std::uint8_t>(i * 37);
-            positions[i] = static_cast<double>(1 + i * 5 % 8);
-            values[i] = i % 3 == 0;
-        }
-        for (unsigned long limit : {n + 1, 1ul}) {
-            runWithLimit(
-                Record{a.data(), positions.data(), values.get(), out.data(), 1, 1, 1, n, {}},
-                limit);
-            for (unsigned long i = 0; i < n; ++i)
-                ASSERT_EQ(out[i], Ftor{}(a[i], positions[i], values[i])) << i << " of " << n;
-        }
-    }
 }
 
 }  // namespace

@@ -46,6 +46,12 @@ private:
     std::size_t at_ = 0;
 };
 
+std::size_t countOf(const Dims& dims) {
+    std::size_t count = 1;
+    for (unsigned long d : dims) count *= d;
+    return count;
+}
+
 bool isNumericClass(zqClassID cls) {
     return cls == zqDoubleClass || cls == zqSingleClass ||
            (cls >= zqInt8Class && cls <= zqUInt64Class);
@@ -189,27 +195,19 @@ zqClassID drawClass(Bytes& in, zqClassID first, bool second) {
 // Sizes: a scalar, the call's base shape, its transpose, an empty one, any.
 Dims drawDims(Bytes& in, const Dims& base, bool large) {
     if (large) return in.oneIn(3) ? Dims{1, 1} : base;
-    switch (in.below(10)) {
-        case 0:
-        case 1:
-        case 2: return {1, 1};
-        case 3:
-        case 4:
-        case 5: return base;
-        case 6: return {base[1], base[0]};
-        case 7: return in.oneIn(2) ? Dims{0, in.below(4)} : Dims{1UL << 62, 0, 1UL << 40};
-        default: {
-            Dims dims(in.below(6));
-            for (auto& size : dims) size = in.below(4);
-            return dims;
-        }
-    }
+    const unsigned pick = in.below(10);
+    if (pick < 3) return {1, 1};
+    if (pick < 6) return base;
+    if (pick == 6) return {base[1], base[0]};
+    if (pick == 7) return in.oneIn(2) ? Dims{0, in.below(4)} : Dims{1UL << 62, 0, 1UL << 40};
+    Dims dims(in.below(6));
+    for (auto& size : dims) size = in.below(4);
+    return dims;
 }
 
 void fillElements(Bytes& in, Operand& op, std::size_t drawn, bool wild) {
     const std::size_t size = reference::elementSize(op.cls);
-    std::size_t count = 1;
-    for (unsigned long d : op.noStoredSizes ? Dims{} : op.dims) count *= d;
+    const std::size_t count = op.noStoredSizes ? 1 : countOf(op.dims);
     op.bytes.resize(count * size);
     for (std::size_t i = 0; i < std::min(count, drawn); ++i) {
         unsigned char* out = op.bytes.data() + i * size;
@@ -246,9 +244,7 @@ Plan drawOperand(Bytes& in, bool typeRole, bool second, zqClassID first, const D
         op.cls = drawClass(in, first, second);
         op.dims = drawDims(in, base, large);
         if (op.cls == zqStringClass) {
-            std::size_t count = 1;
-            for (unsigned long d : op.dims) count *= d;
-            for (std::size_t i = 0; i < count; ++i) op.strings.push_back(drawText(in));
+            for (std::size_t i = 0; i < countOf(op.dims); ++i) op.strings.push_back(drawText(in));
         } else if (op.cls != zqCellClass) {
             op.noStoredSizes = op.dims.empty();
             const bool wild = in.oneIn(4);
@@ -323,9 +319,8 @@ zqArraySlot build(const Operand& op, const Plan& plan) {
         array = host::makeStringArray(op.dims, op.strings);
     } else if (op.cls == zqCellClass) {
         std::vector<zqArraySlot> cells;
-        std::size_t count = 1;
-        for (unsigned long d : op.dims) count *= d;
-        for (std::size_t i = 0; i < count; ++i) cells.push_back(host::makeDoubleScalar(1));
+        for (std::size_t i = 0; i < countOf(op.dims); ++i)
+            cells.push_back(host::makeDoubleScalar(1));
         array = host::makeCellArray(op.dims, std::move(cells));
     } else if (op.noStoredSizes || plan.layout == Layout::sizePointer) {
         array = host::makeArrayWithSizePointer(op.cls, op.noStoredSizes ? Dims{} : op.dims);
@@ -345,23 +340,15 @@ zqArraySlot build(const Operand& op, const Plan& plan) {
     return array;
 }
 
-using EntryPoint = void (*)(int, zqArraySlot*, int, const zqArray_tag**);
-
-EntryPoint entryOf(Function function) {
-    switch (function) {
-        case Function::bitand_: return ondelBitAndFcn;
-        case Function::bitor_: return ondelBitOrFcn;
-        case Function::bitxor_: return ondelBitXorFcn;
-        case Function::bitcmp: return ondelBitCmpFcn;
-        case Function::bitget: return ondelBitGetFcn;
-        case Function::bitset: return ondelBitSetFcn;
-        case Function::bitshift: return ondelBitShiftFcn;
-    }
-    std::abort();
-}
-
-constexpr std::string_view kNames[] = {"bitand", "bitor",  "bitxor",  "bitcmp",
-                                       "bitget", "bitset", "bitshift"};
+// Each function's name and entry point, in the order of reference::Function.
+constexpr struct {
+    std::string_view name;
+    void (*entry)(int, zqArraySlot*, int, const zqArray_tag**);
+} kFunctions[] = {{"bitand", ondelBitAndFcn},    {"bitor", ondelBitOrFcn},
+                  {"bitxor", ondelBitXorFcn},    {"bitcmp", ondelBitCmpFcn},
+                  {"bitget", ondelBitGetFcn},    {"bitset", ondelBitSetFcn},
+                  {"bitshift", ondelBitShiftFcn}};
+const char* nameOf(Function function) { return kFunctions[static_cast<int>(function)].name.data(); }
 
 struct Run {
     std::vector<zqArraySlot> operands;
@@ -389,8 +376,8 @@ Run runOnce(const Call& call) {
     host::resetLegacyErrors();
     if (call.failingAllocation) host::failNextAllocations(1, *call.failingAllocation);
     try {
-        entryOf(call.function)(call.nlhs, &run.slot, static_cast<int>(inputs.size()),
-                               inputs.data());
+        kFunctions[static_cast<int>(call.function)].entry(
+            call.nlhs, &run.slot, static_cast<int>(inputs.size()), inputs.data());
     } catch (const foundation::core::except::IMsgIDException& error) {
         run.error = error.GetID();
     } catch (const std::bad_alloc&) {
@@ -407,29 +394,23 @@ Run runOnce(const Call& call) {
     return run;
 }
 
+// For the report of a fault: up to 64 bytes in hex, and sizes as AxBxC.
 std::string hexOf(const unsigned char* bytes, std::size_t count) {
     std::string text;
-    char digits[4];
-    for (std::size_t i = 0; i < count && i < 64; ++i) {
-        std::snprintf(digits, sizeof digits, "%02x", bytes[i]);
-        text += digits;
-    }
+    for (std::size_t i = 0; i < count && i < 64; ++i)
+        for (int shift : {4, 0}) text += "0123456789abcdef"[bytes[i] >> shift & 15];
     return text + (count > 64 ? "..." : "");
 }
 
 std::string dimsText(const Dims& dims) {
     std::string text;
-    for (unsigned long d : dims) {
-        if (!text.empty()) text += 'x';
-        text += std::to_string(d);
-    }
+    for (unsigned long d : dims) text.append(text.empty() ? "" : "x").append(std::to_string(d));
     return text.empty() ? "(no sizes)" : text;
 }
 
 [[noreturn]] void fail(const std::string& what, const Call& call,
                        const reference::Outcome& expected, const Run& run) {
-    std::fprintf(stderr, "\n*** %s: %s\n", kNames[static_cast<int>(call.function)].data(),
-                 what.c_str());
+    std::fprintf(stderr, "\n*** %s: %s\n", nameOf(call.function), what.c_str());
     std::fprintf(stderr, "nlhs %d, nrhs %zu, failing allocation %ld, quiet legacy %d\n", call.nlhs,
                  call.plans.size(), call.failingAllocation ? long(*call.failingAllocation) : -1L,
                  call.quietLegacy);
@@ -490,8 +471,10 @@ void compare(const Call& call, const reference::Outcome& expected, const Run& ru
             check(shares == (expected.sharesFirst && i == 0),
                   "storage sharing with operand " + std::to_string(i));
         }
-    } else if (!expected.slotFilled) {
-        check(run.slot.get() == run.sentinel, "a refusal changed plhs[0]");
+    } else {
+        check((run.slot.get() != run.sentinel) == expected.slotFilled,
+              expected.slotFilled ? "a refusal left no result in plhs[0]"
+                                  : "a refusal changed plhs[0]");
     }
     for (std::size_t i = 0; i < run.operands.size(); ++i) {
         const zqArray_tag& a = *run.operands[i];
@@ -530,16 +513,15 @@ void checkCall(Function function, const std::uint8_t* data, std::size_t size) {
         }
     }
     if (host::liveArrayCount() != liveBefore) {
-        std::fprintf(stderr, "*** %s: %zu array records leaked\n",
-                     kNames[static_cast<int>(function)].data(),
+        std::fprintf(stderr, "*** %s: %zu array records leaked\n", nameOf(function),
                      host::liveArrayCount() - liveBefore);
         std::abort();
     }
 }
 
 std::optional<Function> functionNamed(std::string_view name) {
-    for (std::size_t i = 0; i < std::size(kNames); ++i) {
-        if (kNames[i] == name) return static_cast<Function>(i);
+    for (std::size_t i = 0; i < std::size(kFunctions); ++i) {
+        if (kFunctions[i].name == name) return static_cast<Function>(i);
     }
     return std::nullopt;
 }

@@ -178,7 +178,7 @@ using Dims = std::vector<unsigned long>;
 // Refuses with `id` at the first of the first `count` elements of `a` that
 // isn't `valid`: a scalar's one element is tested even for an empty result.
 template <class Test>
-void scan(const Operand& a, std::size_t count, const char* id, Test valid) {
+void scan(const Operand& a, std::size_t count, const std::string& id, Test valid) {
     for (std::size_t i = 0, n = isScalar(a) ? 1 : count; i < n; ++i) {
         if (!valid(i)) refuse(id);
     }
@@ -194,10 +194,13 @@ Operand fresh(zqClassID cls, const Dims& dims) {
 }
 
 // The sizes of a result where only a scalar adapts to the other operand.
-Dims scalarOrSame(const Operand& a, const Operand& b, const char* sizeId) {
+Dims scalarOrSame(const Operand& a, const Operand& b, const std::string& sizeId) {
     if (!isScalar(a) && !isScalar(b) && shapeOf(a) != shapeOf(b)) refuse(sizeId);
     return isScalar(a) ? shapeOf(b) : shapeOf(a);
 }
+
+// The index in `a` of a result's element `i`: `i`, or 0 where `a` is scalar.
+std::size_t at(const Operand& a, std::size_t i) { return isScalar(a) ? 0 : i; }
 
 class Model {
 public:
@@ -211,9 +214,9 @@ public:
                 case Function::bitor_: logic('|', "VESPRA:Bitor"); break;
                 case Function::bitxor_: logic('^', "VESPRA:bitxor"); break;
                 case Function::bitcmp: bitcmp(); break;
-                case Function::bitget: bitget(); break;
+                case Function::bitget: getOrShift(false); break;
                 case Function::bitset: bitset(); break;
-                case Function::bitshift: bitshift(); break;
+                case Function::bitshift: getOrShift(true); break;
             }
         } catch (const Refusal& refusal) {
             outcome_ = Outcome{};
@@ -315,6 +318,18 @@ private:
         return r;
     }
 
+    // An assumed type given with integer values must name their class.
+    static void expectType(const Operand* type, zqClassID cls, const std::string& group) {
+        if (!type) return;
+        const zqClassID named = parseType(*type);
+        if (!named) refuse(group + ":unknownTypeString");
+        if (named != cls) refuse(group + ":invalidTypeString");
+    }
+
+    bool bothDoubles() const {
+        return storedIs(in_[0], zqDoubleClass) && storedIs(in_[1], zqDoubleClass);
+    }
+
     bool allFit(const Operand& a, zqClassID cls) {
         for (std::size_t i = 0, n = countOf(a); i < n; ++i) {
             if (!fits(realAt(a, i), cls)) return false;
@@ -346,11 +361,7 @@ private:
                 !(cb == zqDoubleClass && isScalar(b))) {
                 fail("mixedClasses");
             }
-            if (in_.size() == 3) {
-                const zqClassID type = parseType(in_[2]);
-                if (!type) fail("unknownTypeString");
-                if (type != cls) fail("invalidTypeString");
-            }
+            expectType(in_.size() == 3 ? &in_[2] : nullptr, cls, group);
             for (const Operand* x : {&a, &b}) {
                 if (x->cls == zqDoubleClass && !allFit(*x, cls)) fail("outOfRangeMixedType");
             }
@@ -401,70 +412,69 @@ private:
         }
         if (a.opaque || !isInteger(a.cls)) refuse("VESPRA:bitcmp:firstArgNotInt");
         if (isComplex(a)) refuse("VESPRA:bitcmp:complexOperands");
-        if (in_.size() == 2) {
-            const zqClassID type = parseType(in_[1]);
-            if (!type) refuse("VESPRA:bitcmp:unknownTypeString");
-            if (type != a.cls) refuse("VESPRA:bitcmp:invalidTypeString");
-        }
+        expectType(in_.size() == 2 ? &in_[1] : nullptr, a.cls, "VESPRA:bitcmp");
         Operand r = makeResult(a, true, a.cls, shapeOf(a), false);
         for (std::size_t i = 0, n = countOf(a); i < n; ++i) put(r, i, ~integerAt(a, i));
         finish(std::move(r));
     }
 
-    void bitget() {
+    // bitget and bitshift (`shift`) test two operands in one order. Their
+    // integer path words a first operand of no integer class and unequal
+    // sizes in a group of its own, and fills the slot only for bitshift.
+    void getOrShift(bool shift) {
         counts(2, 3);
-        const Operand* type = in_.size() == 3 ? &in_[2] : nullptr;
-        if (storedIs(in_[0], zqDoubleClass) && storedIs(in_[1], zqDoubleClass)) {
-            finish(bitgetOnDouble(in_[0], in_[1], type, true));
-        } else {
-            finish(bitgetOnInteger(in_[0], in_[1], type));
-        }
-    }
-
-    Operand bitgetOnDouble(const Operand& a, const Operand& p, const Operand* type, bool intoSlot) {
-        if (a.sparse || p.sparse) refuse("VESPRA:bitget:sparseArgs");
-        if (isComplex(a) || isComplex(p)) refuse("VESPRA:bitget:complexArgs");
-        const bool aS = isScalar(a), pS = isScalar(p);
-        const Dims dims = scalarOrSame(a, p, "VESPRA:bitget:sizeMismatch");
-        const zqClassID cls = type ? parseType(*type) : zqUInt64Class;
-        Operand r = makeResult(a, !aS, zqDoubleClass, dims, intoSlot);
-        if (!isInteger(cls)) refuse("VESPRA:bitget:unknownTypeString");
-        const std::size_t n = countOf(dims);
-        scan(a, n, "VESPRA:bitget:outOfRange",
-             [&](std::size_t i) { return fits(realAt(a, i), cls); });
-        scan(p, n, "VESPRA:bitSetGet:BITOutOfRange",
-             [&](std::size_t i) { return positionAt(p, i, widthOf(cls)); });
-        for (std::size_t i = 0; i < n; ++i) {
-            const Int v = exact(realAt(a, aS ? 0 : i));
-            putDouble(r, i,
-                      static_cast<double>((v >> static_cast<int>(countAt(p, pS ? 0 : i) - 1)) & 1));
-        }
-        return r;
-    }
-
-    Operand bitgetOnInteger(const Operand& a, const Operand& p, const Operand* type) {
-        if (a.sparse || p.sparse) refuse("VESPRA:bitget:sparseArgs");
-        if (!isNumeric(a) || !isNumeric(p)) refuse("VESPRA:bitget:numericArg");
+        const std::string group = shift ? "VESPRA:bitshift" : "VESPRA:bitget";
+        const std::string integerGroup = shift ? group : "VESPRA:bitSetGet";
+        const Operand &a = in_[0], &b = in_[1], *type = in_.size() == 3 ? &in_[2] : nullptr;
+        if (bothDoubles()) return finish(getOrShiftOnDouble(shift, a, b, type, true));
+        if (a.sparse || b.sparse) refuse(group + ":sparseArgs");
+        if (!isNumeric(a) || !isNumeric(b)) refuse(group + ":numericArg");
         if (a.cls == zqDoubleClass) {
-            if (p.cls == zqSingleClass) refuse("VESPRA:bitSetGet:firstArgNotInt");
-            return bitgetOnDouble(a, converted(p, zqDoubleClass), type, false);
+            if (b.cls == zqSingleClass) refuse(integerGroup + ":firstArgNotInt");
+            return finish(getOrShiftOnDouble(shift, a, converted(b, zqDoubleClass), type, shift));
         }
-        if (!isInteger(a.cls)) refuse("VESPRA:bitSetGet:firstArgNotInt");
-        if (isComplex(a) || isComplex(p)) refuse("VESPRA:bitget:complexArgs");
-        const bool aS = isScalar(a), pS = isScalar(p);
-        const Dims dims = scalarOrSame(a, p, "VESPRA:bitSetGet:sizeMismatch");
-        if (type) {
-            const zqClassID cls = parseType(*type);
-            if (!cls) refuse("VESPRA:bitget:unknownTypeString");
-            if (cls != a.cls) refuse("VESPRA:bitget:invalidTypeString");
-        }
-        Operand r = makeResult(a, !aS, a.cls, dims, false);
+        if (!isInteger(a.cls)) refuse(integerGroup + ":firstArgNotInt");
+        if (isComplex(a) || isComplex(b)) refuse(group + ":complexArgs");
+        const Dims dims = scalarOrSame(a, b, integerGroup + ":sizeMismatch");
+        expectType(type, a.cls, group);
+        Operand r = makeResult(a, !isScalar(a), a.cls, dims, shift);
         const std::size_t n = countOf(dims);
-        scan(p, n, "VESPRA:bitSetGet:BITOutOfRange",
-             [&](std::size_t i) { return positionAt(p, i, widthOf(a.cls)); });
+        if (!shift) {
+            scan(b, n, "VESPRA:bitSetGet:BITOutOfRange",
+                 [&](std::size_t i) { return positionAt(b, i, widthOf(a.cls)); });
+        } else if (!isInteger(b.cls)) {
+            scan(b, n, "VESPRA:bitshift:inputsMustBeIntegers",
+                 [&](std::size_t i) { return isWhole(realAt(b, i)); });
+        }
         for (std::size_t i = 0; i < n; ++i) {
-            const int bit = static_cast<int>(countAt(p, pS ? 0 : i) - 1);
-            put(r, i, (integerAt(a, aS ? 0 : i) >> bit) & 1);
+            const Int x = integerAt(a, at(a, i)), k = countAt(b, at(b, i));
+            put(r, i, shift ? shifted(x, a.cls, k) : (x >> static_cast<int>(k - 1)) & 1);
+        }
+        finish(std::move(r));
+    }
+
+    Operand getOrShiftOnDouble(bool shift, const Operand& a, const Operand& b, const Operand* type,
+                               bool intoSlot) {
+        const std::string group = shift ? "VESPRA:bitshift" : "VESPRA:bitget";
+        if (a.sparse || b.sparse) refuse(group + ":sparseArgs");
+        if (isComplex(a) || isComplex(b)) refuse(group + ":complexArgs");
+        const Dims dims = scalarOrSame(a, b, group + ":sizeMismatch");
+        const zqClassID cls = type ? parseType(*type) : zqUInt64Class;
+        Operand r = makeResult(a, !isScalar(a), zqDoubleClass, dims, intoSlot);
+        if (!isInteger(cls)) refuse(group + ":unknownTypeString");
+        const std::size_t n = countOf(dims);
+        scan(a, n, group + ":outOfRange", [&](std::size_t i) { return fits(realAt(a, i), cls); });
+        if (shift) {
+            scan(b, n, "VESPRA:bitshift:inputsMustBeIntegers",
+                 [&](std::size_t i) { return isWhole(realAt(b, i)); });
+        } else {
+            scan(b, n, "VESPRA:bitSetGet:BITOutOfRange",
+                 [&](std::size_t i) { return positionAt(b, i, widthOf(cls)); });
+        }
+        for (std::size_t i = 0; i < n; ++i) {
+            const Int x = exact(realAt(a, at(a, i))), k = countAt(b, at(b, i));
+            putDouble(r, i,
+                      toDouble(shift ? shifted(x, cls, k) : (x >> static_cast<int>(k - 1)) & 1));
         }
         return r;
     }
@@ -486,9 +496,17 @@ private:
         return shapeOf(a);
     }
 
+    // Element `i` of bitset's result: `x` with bit BIT(i) set, or cleared
+    // where V(i) is false, as a value of `cls`.
+    static Int setOrCleared(Int x, const Operand& bit, const Operand* v, std::size_t i,
+                            zqClassID cls) {
+        const Int mask = Int(1) << static_cast<int>(countAt(bit, at(bit, i)) - 1);
+        return wrap(!v || truthAt(*v, at(*v, i)) ? x | mask : x & ~mask, cls);
+    }
+
     void bitset() {
         counts(2, 4);
-        if (storedIs(in_[0], zqDoubleClass) && storedIs(in_[1], zqDoubleClass)) {
+        if (bothDoubles()) {
             std::vector<const Operand*> list;
             for (const Operand& x : in_) list.push_back(&x);
             return finish(bitsetOnDouble(list, true));
@@ -527,16 +545,12 @@ private:
         Operand r = makeResult(a, !isScalar(a), zqDoubleClass, dims, intoSlot);
         if (!isInteger(cls)) refuse("VESPRA:bitset:unknownTypeString");
         const std::size_t n = countOf(dims);
-        const bool aS = isScalar(a), bS = isScalar(bit), vS = !v || isScalar(*v);
         scan(a, n, "VESPRA:bitset:outOfRange",
              [&](std::size_t i) { return fits(realAt(a, i), cls); });
         scan(bit, n, "VESPRA:bitSetGet:BITOutOfRange",
              [&](std::size_t i) { return positionAt(bit, i, widthOf(cls)); });
         for (std::size_t i = 0; i < n; ++i) {
-            const Int x = exact(realAt(a, aS ? 0 : i));
-            const Int mask = Int(1) << static_cast<int>(countAt(bit, bS ? 0 : i) - 1);
-            const bool on = !v || truthAt(*v, vS ? 0 : i);
-            putDouble(r, i, toDouble(wrap(on ? x | mask : x & ~mask, cls)));
+            putDouble(r, i, toDouble(setOrCleared(exact(realAt(a, at(a, i))), bit, v, i, cls)));
         }
         return r;
     }
@@ -559,79 +573,13 @@ private:
         }
         const Dims dims = bitsetShape(
             a, bit, v, v ? "VESPRA:bitset:sizeMismatch" : "VESPRA:bitSetGet:sizeMismatch");
-        if (type) {
-            const zqClassID cls = parseType(*type);
-            if (!cls) refuse("VESPRA:bitset:unknownTypeString");
-            if (cls != a.cls) refuse("VESPRA:bitset:invalidTypeString");
-        }
+        expectType(type, a.cls, "VESPRA:bitset");
         Operand r = makeResult(a, !isScalar(a), a.cls, dims, false);
         const std::size_t n = countOf(dims);
-        const bool aS = isScalar(a), bS = isScalar(bit), vS = !v || isScalar(*v);
         scan(bit, n, "VESPRA:bitSetGet:BITOutOfRange",
              [&](std::size_t i) { return positionAt(bit, i, widthOf(a.cls)); });
         for (std::size_t i = 0; i < n; ++i) {
-            const Int x = integerAt(a, aS ? 0 : i);
-            const Int mask = Int(1) << static_cast<int>(countAt(bit, bS ? 0 : i) - 1);
-            const bool on = !v || truthAt(*v, vS ? 0 : i);
-            put(r, i, wrap(on ? x | mask : x & ~mask, a.cls));
-        }
-        return r;
-    }
-
-    void bitshift() {
-        counts(2, 3);
-        const Operand* type = in_.size() == 3 ? &in_[2] : nullptr;
-        if (storedIs(in_[0], zqDoubleClass) && storedIs(in_[1], zqDoubleClass)) {
-            finish(bitshiftOnDouble(in_[0], in_[1], type));
-        } else {
-            finish(bitshiftOnInteger(in_[0], in_[1], type));
-        }
-    }
-
-    Operand bitshiftOnDouble(const Operand& x, const Operand& k, const Operand* type) {
-        if (x.sparse || k.sparse) refuse("VESPRA:bitshift:sparseArgs");
-        if (isComplex(x) || isComplex(k)) refuse("VESPRA:bitshift:complexArgs");
-        const bool xS = isScalar(x), kS = isScalar(k);
-        const Dims dims = scalarOrSame(x, k, "VESPRA:bitshift:sizeMismatch");
-        const zqClassID cls = type ? parseType(*type) : zqUInt64Class;
-        Operand r = makeResult(x, !xS, zqDoubleClass, dims, true);
-        if (!isInteger(cls)) refuse("VESPRA:bitshift:unknownTypeString");
-        const std::size_t n = countOf(dims);
-        scan(x, n, "VESPRA:bitshift:outOfRange",
-             [&](std::size_t i) { return fits(realAt(x, i), cls); });
-        scan(k, n, "VESPRA:bitshift:inputsMustBeIntegers",
-             [&](std::size_t i) { return isWhole(realAt(k, i)); });
-        for (std::size_t i = 0; i < n; ++i) {
-            const Int v = shifted(exact(realAt(x, xS ? 0 : i)), cls, countAt(k, kS ? 0 : i));
-            putDouble(r, i, toDouble(v));
-        }
-        return r;
-    }
-
-    Operand bitshiftOnInteger(const Operand& x, const Operand& k, const Operand* type) {
-        if (x.sparse || k.sparse) refuse("VESPRA:bitshift:sparseArgs");
-        if (!isNumeric(x) || !isNumeric(k)) refuse("VESPRA:bitshift:numericArg");
-        if (x.cls == zqDoubleClass) {
-            if (k.cls == zqSingleClass) refuse("VESPRA:bitshift:firstArgNotInt");
-            return bitshiftOnDouble(x, converted(k, zqDoubleClass), type);
-        }
-        if (!isInteger(x.cls)) refuse("VESPRA:bitshift:firstArgNotInt");
-        if (isComplex(x) || isComplex(k)) refuse("VESPRA:bitshift:complexArgs");
-        const bool xS = isScalar(x), kS = isScalar(k);
-        const Dims dims = scalarOrSame(x, k, "VESPRA:bitshift:sizeMismatch");
-        if (type) {
-            const zqClassID cls = parseType(*type);
-            if (!cls) refuse("VESPRA:bitshift:unknownTypeString");
-            if (cls != x.cls) refuse("VESPRA:bitshift:invalidTypeString");
-        }
-        Operand r = makeResult(x, !xS, x.cls, dims, true);
-        const std::size_t n = countOf(dims);
-        if (!isInteger(k.cls)) {
-            scan(k, n, "VESPRA:bitshift:inputsMustBeIntegers",
-                 [&](std::size_t i) { return isWhole(realAt(k, i)); });
-        }
-        for (std::size_t i = 0; i < n; ++i) {
-            put(r, i, shifted(integerAt(x, xS ? 0 : i), x.cls, countAt(k, kS ? 0 : i)));
+            put(r, i, setOrCleared(integerAt(a, at(a, i)), bit, v, i, a.cls));
         }
         return r;
     }

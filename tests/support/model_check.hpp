@@ -11,6 +11,7 @@
 #include <cmath>
 #include <cstdint>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 namespace testing_support {
@@ -21,10 +22,10 @@ inline zqArraySlot flagged(zqArraySlot array, bool inPlace = true) {
     return array;
 }
 
-// The model's outcome: the same refusal, with the slot filled only where the
-// model fills it and every operand as it was; or the same class, sizes and
+// The model's outcome: the same refusal, or the same class, sizes and
 // elements, taking over the first operand's storage exactly when the model
-// does. Either way no array record is left behind.
+// does; and no array record left behind. (What a refused call leaves in its
+// operands and in plhs[0] is the fuzz harness's to check.)
 inline void expectModelOutcome(reference::Function function, EntryPoint entry,
                                const std::vector<const zqArray_tag*>& inputs) {
     const std::size_t liveBefore = host::liveArrayCount();
@@ -43,15 +44,7 @@ inline void expectModelOutcome(reference::Function function, EntryPoint entry,
         zqArraySlot result;
         ASSERT_EQ(callEntry(entry, inputs, &result), expected.error)
             << "the library, then the model";
-        if (!expected.error.empty()) {
-            EXPECT_EQ(result != nullptr, expected.slotFilled);
-            for (std::size_t i = 0; i < inputs.size(); ++i) {
-                const auto* now = static_cast<const unsigned char*>(inputs[i]->data);
-                EXPECT_TRUE(std::equal(operands[i].bytes.begin(), operands[i].bytes.end(), now))
-                    << "a refused call changed operand " << i;
-            }
-            return;
-        }
+        if (!expected.error.empty()) return;
         ASSERT_EQ(host::classOf(*result), expected.cls);
         ASSERT_EQ(host::dimensions(*result), expected.dims);
         EXPECT_EQ(host::storageIdentity(*result) == host::storageIdentity(*inputs[0]),
@@ -83,6 +76,16 @@ std::vector<double> edgeDoublesOf() {
         v.push_back(low < 0 && (s & 1024) ? -m : m);
     }
     return v;
+}
+
+// `values` with each whole number from `first` to `last` in turn: arrays that
+// pair every value with every number, so that neighbouring elements differ.
+inline std::pair<zqArraySlot, zqArraySlot> pairedWithEach(const std::vector<double>& values,
+                                                          double first, double last) {
+    std::vector<double> paired, numbers;
+    for (double x : values)
+        for (double k = first; k <= last; ++k) paired.push_back(x), numbers.push_back(k);
+    return {makeOf(paired), makeOf(numbers)};
 }
 
 // T's class name, the assumed type of a double path.
