@@ -1,8 +1,8 @@
 // Benchmarks of bitand, bitor and bitxor through their entry points, with a
 // result the host allocates per call: two uint8 or two uint64 arrays (the
-// integer path), two double arrays (the default path: validation, conversion
-// to uint64, the element routine and the conversion back), and a uint8 array
-// with a double scalar.
+// integer path), two double arrays (the default path: the checked loop,
+// which tests both operands and writes the double result in one pass), and
+// a uint8 array with a double scalar.
 #include "bench_support.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "host/array_factory.hpp"

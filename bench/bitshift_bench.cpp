@@ -1,6 +1,6 @@
 // Benchmarks of bitshift through its entry point on host arrays: double
-// values (under an assumed class: the validation scans, then the shift in
-// doubles) and integer values of every class, each by one scalar count (the
+// values (under an assumed class: the checked loop, which tests and shifts
+// in one pass) and integer values of every class, each by one scalar count (the
 // SIMD shifts; the plain serial loop for int64 to the right) or by an array
 // of counts of class int8 (the shift rule per element), left by 3 or right by
 // 3, with a result the host allocates per call or one that takes over the
