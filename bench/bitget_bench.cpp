@@ -1,9 +1,10 @@
 // Benchmarks of bitget through its entry point on host arrays: double values
-// (assumed uint64: the scan of the values, the scan of the positions, then
-// the conversion loop) and integer values, each with one double position (for
-// integers the SIMD family) or with an array of positions (of the values'
-// class), with a result the host allocates per call or one that takes over
-// the values' storage (the operand flagged 0x200).
+// (assumed uint64: the checked loop, which tests values and positions and
+// reads the bit in one pass; in place a test pass comes first) and integer
+// values, each with one double position (for integers the SIMD family) or
+// with an array of positions (of the values' class), with a result the host
+// allocates per call or one that takes over the values' storage (the operand
+// flagged 0x200).
 #include "bench_support.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "host/array_factory.hpp"
