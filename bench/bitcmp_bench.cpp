@@ -1,8 +1,9 @@
 // Benchmarks of bitcmp through its entry point on host arrays: double
 // operands (assumed uint64: the checked loop, which tests and complements in
-// one pass; in place a test pass comes first) and integer operands (the host's complement loop), at the counts around the
-// double path's parallel limit, with a result the host allocates per call
-// or one that takes over the operand's storage (the operand flagged 0x200).
+// one pass; in place a test pass comes first) and integer operands (the
+// host's complement loop), at the counts around the double path's parallel
+// limit, with a result the host allocates per call or one that takes over
+// the operand's storage (the operand flagged 0x200).
 #include "bench_support.hpp"
 #include "bitfcns/entry_points.hpp"
 #include "engine/parallel_limits.hpp"

@@ -146,7 +146,8 @@ TYPED_TEST(Families, RunsAroundTheParallelLimitMatchTheModel) {
     using T = TypeParam;
     forEachFamily<T>([](const char* name, unsigned long limit, bool, auto run, auto model) {
         std::vector<unsigned long> lengths{limit - 1, limit};
-        if (std::is_same_v<T, unsigned short>) lengths.push_back(streamingResultBytes / 2 + 77);
+        if (std::is_same_v<T, unsigned short>)
+            lengths.push_back(streamingResultBytes / sizeof(T) + 77);
         const unsigned long longest = lengths.back();
         const std::vector<T> data = testValues<T>(longest + 1, 5),
                              values = testValues<T>(longest + 1, 6);
